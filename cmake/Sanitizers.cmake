@@ -1,0 +1,5 @@
+# -DLUMERIS_SANITIZE=ON builds everything with ASan and UBSan; ./test runs the suite in both builds.
+if(LUMERIS_SANITIZE)
+  add_compile_options(-fsanitize=address,undefined -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
+  add_link_options(-fsanitize=address,undefined)
+endif()

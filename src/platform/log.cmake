@@ -1,0 +1,3 @@
+add_library(lumeris_log STATIC log.cc)
+set_target_properties(lumeris_log PROPERTIES POSITION_INDEPENDENT_CODE ON)
+target_link_libraries(lumeris_log PUBLIC lumeris_config)

@@ -1,0 +1,79 @@
+// ScopedEnv sets environment variables for its lifetime and restores the old values after.
+// IsolatedUserEnvironment points HOME and the XDG directories at a fresh temporary directory,
+// so a test can write preferences and sockets without touching anybody's real files.
+//
+// Not thread-safe: the environment is process-wide. Use from the test's main thread, before
+// the code under test starts threads.
+#pragma once
+
+#include <stdlib.h>
+#include <sys/stat.h>
+
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "support/temp_dir.h"
+
+namespace lumeris::testing {
+
+class ScopedEnv {
+ public:
+  ScopedEnv() = default;
+  ScopedEnv(const ScopedEnv&) = delete;
+  ScopedEnv& operator=(const ScopedEnv&) = delete;
+  ~ScopedEnv() {
+    for (auto it = saved_.rbegin(); it != saved_.rend(); ++it) {
+      if (it->second) {
+        setenv(it->first.c_str(), it->second->c_str(), 1);
+      } else {
+        unsetenv(it->first.c_str());
+      }
+    }
+  }
+
+  // Sets `name` to `value`; std::nullopt unsets it.
+  void Set(const std::string& name, const std::optional<std::string>& value) {
+    const char* old = getenv(name.c_str());
+    saved_.emplace_back(name, old ? std::optional<std::string>(old) : std::nullopt);
+    if (value) {
+      setenv(name.c_str(), value->c_str(), 1);
+    } else {
+      unsetenv(name.c_str());
+    }
+  }
+
+ private:
+  std::vector<std::pair<std::string, std::optional<std::string>>> saved_;
+};
+
+class IsolatedUserEnvironment {
+ public:
+  IsolatedUserEnvironment() {
+    const auto& root = dir_.path();
+    for (const char* sub : {"home", "config", "config-dirs", "runtime"}) {
+      std::filesystem::create_directories(root / sub);
+    }
+    chmod((root / "runtime").c_str(), 0700);
+    env_.Set("HOME", (root / "home").string());
+    env_.Set("XDG_CONFIG_HOME", (root / "config").string());
+    env_.Set("XDG_CONFIG_DIRS", (root / "config-dirs").string());
+    env_.Set("XDG_RUNTIME_DIR", (root / "runtime").string());
+  }
+
+  const std::filesystem::path& root() const { return dir_.path(); }
+  std::filesystem::path home() const { return dir_.path() / "home"; }
+  std::filesystem::path config_home() const { return dir_.path() / "config"; }
+  std::filesystem::path config_dirs() const { return dir_.path() / "config-dirs"; }
+  std::filesystem::path runtime_dir() const { return dir_.path() / "runtime"; }
+  // Further variables for this test only (restored with the rest).
+  ScopedEnv& env() { return env_; }
+
+ private:
+  ScopedTempDir dir_;
+  ScopedEnv env_;
+};
+
+}  // namespace lumeris::testing
