@@ -1,0 +1,92 @@
+// The two fixed emoji tables: the emoji that accept a skin-tone modifier (ordered), and the
+// characters that have both a text and an emoji presentation (membership only).
+//
+// Thread-safety: constant data, shared read-only by all callers.
+// Ownership: static storage; the spans never dangle.
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <span>
+
+namespace lumeris {
+
+// The five skin-tone modifiers, U+1F3FB..U+1F3FF.
+inline constexpr uint32_t kFirstSkinToneModifier = 0x1F3FB;
+inline constexpr uint32_t kLastSkinToneModifier = 0x1F3FF;
+// The presentation selectors.
+inline constexpr uint32_t kTextPresentationSelector = 0xFE0E;
+inline constexpr uint32_t kEmojiPresentationSelector = 0xFE0F;
+
+constexpr bool IsSkinToneModifier(uint32_t value) {
+  return value >= kFirstSkinToneModifier && value <= kLastSkinToneModifier;
+}
+
+// The emoji that accept a skin-tone modifier. The order matters: when a string holds two of them,
+// the one listed first is the one reported.
+inline constexpr std::array<uint32_t, 64> kSkinToneBaseTable = {
+    0x261D,  0x270A,  0x270B,  0x270C,  0x1F385, 0x1F3C3, 0x1F3C4, 0x1F3CA, 0x1F442, 0x1F443,
+    0x1F446, 0x1F447, 0x1F448, 0x1F449, 0x1F44A, 0x1F44B, 0x1F44C, 0x1F44D, 0x1F44E, 0x1F44F,
+    0x1F450, 0x1F466, 0x1F467, 0x1F468, 0x1F469, 0x1F46E, 0x1F470, 0x1F471, 0x1F472, 0x1F473,
+    0x1F474, 0x1F475, 0x1F476, 0x1F477, 0x1F478, 0x1F47C, 0x1F481, 0x1F482, 0x1F483, 0x1F485,
+    0x1F486, 0x1F487, 0x1F4AA, 0x1F575, 0x1F645, 0x1F646, 0x1F647, 0x1F64B, 0x1F64C, 0x1F64D,
+    0x1F64E, 0x1F64F, 0x1F6A3, 0x1F6B4, 0x1F6B5, 0x1F6B6, 0x1F6C0, 0x26F9,  0x270D,  0x1F3CB,
+    0x1F590, 0x1F595, 0x1F596, 0x1F918,
+};
+
+namespace emoji_tables_detail {
+
+struct ScalarRange {
+  uint32_t first;
+  uint32_t last;
+};
+
+// The variant-capable characters, written as inclusive ranges.
+inline constexpr ScalarRange kVariantRanges[] = {
+    {0x0023, 0x0023},   {0x002A, 0x002A},   {0x0030, 0x0039},   {0x00A9, 0x00A9},
+    {0x00AE, 0x00AE},   {0x203C, 0x203C},   {0x2049, 0x2049},   {0x2122, 0x2122},
+    {0x2139, 0x2139},   {0x2194, 0x2199},   {0x21A9, 0x21AA},   {0x231A, 0x231B},
+    {0x2328, 0x2328},   {0x24C2, 0x24C2},   {0x25AA, 0x25AB},   {0x25B6, 0x25B6},
+    {0x25C0, 0x25C0},   {0x25FB, 0x25FE},   {0x2600, 0x2604},   {0x260E, 0x260E},
+    {0x2611, 0x2611},   {0x2614, 0x2615},   {0x261D, 0x261D},   {0x2620, 0x2620},
+    {0x2622, 0x2623},   {0x2626, 0x2626},   {0x262A, 0x262A},   {0x262E, 0x262F},
+    {0x2638, 0x263A},   {0x2648, 0x2653},   {0x2660, 0x2660},   {0x2663, 0x2663},
+    {0x2665, 0x2666},   {0x2668, 0x2668},   {0x267B, 0x267B},   {0x267F, 0x267F},
+    {0x2693, 0x2693},   {0x26A0, 0x26A1},   {0x26AA, 0x26AB},   {0x26BD, 0x26BE},
+    {0x26C4, 0x26C5},   {0x26D4, 0x26D4},   {0x26EA, 0x26EA},   {0x26F2, 0x26F3},
+    {0x26F5, 0x26F5},   {0x26FA, 0x26FA},   {0x26FD, 0x26FD},   {0x2702, 0x2702},
+    {0x2708, 0x2709},   {0x270C, 0x270D},   {0x270F, 0x270F},   {0x2712, 0x2712},
+    {0x2714, 0x2714},   {0x2716, 0x2716},   {0x271D, 0x271D},   {0x2721, 0x2721},
+    {0x2733, 0x2734},   {0x2744, 0x2744},   {0x2747, 0x2747},   {0x2757, 0x2757},
+    {0x2763, 0x2764},   {0x27A1, 0x27A1},   {0x2934, 0x2935},   {0x2B05, 0x2B07},
+    {0x2B1B, 0x2B1C},   {0x2B50, 0x2B50},   {0x2B55, 0x2B55},   {0x3030, 0x3030},
+    {0x303D, 0x303D},   {0x3297, 0x3297},   {0x3299, 0x3299},   {0x1F004, 0x1F004},
+    {0x1F170, 0x1F171}, {0x1F17E, 0x1F17F}, {0x1F202, 0x1F202}, {0x1F21A, 0x1F21A},
+    {0x1F22F, 0x1F22F}, {0x1F237, 0x1F237},
+};
+
+constexpr size_t CountVariantScalars() {
+  size_t count = 0;
+  for (const ScalarRange& range : kVariantRanges) count += range.last - range.first + 1;
+  return count;
+}
+
+template <size_t N>
+constexpr std::array<uint32_t, N> ExpandVariantRanges() {
+  std::array<uint32_t, N> table{};
+  size_t next = 0;
+  for (const ScalarRange& range : kVariantRanges) {
+    for (uint32_t value = range.first; value <= range.last; ++value) table[next++] = value;
+  }
+  return table;
+}
+
+}  // namespace emoji_tables_detail
+
+// The characters that take a presentation selector (U+FE0E or U+FE0F), in ascending order.
+inline constexpr std::array<uint32_t, 134> kVariantEmojiTable =
+    emoji_tables_detail::ExpandVariantRanges<134>();
+static_assert(emoji_tables_detail::CountVariantScalars() == kVariantEmojiTable.size(),
+              "the variant-capable table must hold exactly 134 characters");
+
+}  // namespace lumeris
