@@ -1,0 +1,23 @@
+#include "service/string_array.h"
+
+namespace lumeris {
+
+MessageValue CreateXPCArrayFromStringArray(const StringList& strings) {
+  if (!strings || strings->empty()) return MessageValue::Null();
+  MessageValue::Array elements;
+  elements.reserve(strings->size());
+  for (const std::string& entry : *strings) elements.push_back(MessageValue::String(entry));
+  return MessageValue::MakeArray(std::move(elements));
+}
+
+StringList StringArrayFromXPCArray(const MessageValue* value) {
+  const MessageValue::Array* elements = value ? value->AsArray() : nullptr;
+  if (elements == nullptr || elements->empty()) return std::nullopt;
+  std::vector<std::string> strings;
+  for (const MessageValue& element : *elements) {
+    if (const std::string* text = element.AsString()) strings.push_back(*text);
+  }
+  return strings;
+}
+
+}  // namespace lumeris
