@@ -37,8 +37,9 @@ bool StartsWith(const icu::UnicodeString& text, std::u16string_view prefix) {
   return UnitsOf(text).starts_with(prefix);
 }
 
+// A copy of `text` after `prefix` (a copy, not an alias: the results outlive the ID they came from).
 icu::UnicodeString Rest(const icu::UnicodeString& text, std::u16string_view prefix) {
-  return text.tempSubString(static_cast<int32_t>(prefix.size()));
+  return icu::UnicodeString(text, static_cast<int32_t>(prefix.size()));
 }
 
 // A JSON number (or boolean) as an unsigned 32-bit glyph: integers keep their low 32 bits,
