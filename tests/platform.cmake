@@ -4,3 +4,8 @@ lumeris_add_gtest(property_list_test
   SOURCES platform/property_list_test.cc
   LIBS lumeris_plist
   LABELS platform)
+
+lumeris_add_gtest(preference_store_test
+  SOURCES platform/preference_store_test.cc
+  LIBS lumeris_preferences
+  LABELS platform)

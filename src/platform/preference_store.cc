@@ -1,0 +1,159 @@
+#include "platform/preference_store.h"
+
+#include <utility>
+
+#include "platform/property_list_io.h"
+
+namespace lumeris {
+
+struct PreferenceStore::Domain {
+  explicit Domain(std::filesystem::path file_path, bool is_writable)
+      : path(std::move(file_path)), writable(is_writable) {}
+
+  const std::filesystem::path path;
+  const bool writable;
+
+  std::mutex mutex;
+  // Everything below is guarded by `mutex`.
+  bool loaded = false;
+  std::optional<FileStamp> stamp;  // of the file `base` came from; nullopt when there was none
+  bool corrupt = false;            // the file exists but did not parse
+  plist::Dictionary base;          // the file's content as last read or written
+  std::map<std::string, std::optional<plist::Value>, std::less<>> pending;  // nullopt: removal
+
+  const plist::Value* Lookup(std::string_view key) const {
+    if (auto it = pending.find(key); it != pending.end()) return it->second ? &*it->second : nullptr;
+    auto it = base.find(key);
+    return it == base.end() ? nullptr : &it->second;
+  }
+
+  plist::Dictionary View() const {
+    plist::Dictionary view = base;
+    for (const auto& [key, value] : pending) {
+      if (value) {
+        view.insert_or_assign(key, *value);
+      } else if (auto it = view.find(key); it != view.end()) {
+        view.erase(it);
+      }
+    }
+    return view;
+  }
+};
+
+PreferenceStore::PreferenceStore(std::shared_ptr<PreferencesFileSystem> file_system)
+    : file_system_(std::move(file_system)) {}
+
+PreferenceStore::~PreferenceStore() = default;
+
+PreferenceStore& PreferenceStore::Shared() {
+  static PreferenceStore* const shared = new PreferenceStore();
+  return *shared;
+}
+
+PreferenceStore::Domain* PreferenceStore::Find(std::string_view domain, PreferencesUser user,
+                                               PreferencesHost host) {
+  std::optional<std::filesystem::path> path = PreferencesFilePath(domain, user, host);
+  if (!path) return nullptr;
+  std::lock_guard lock(domains_mutex_);
+  auto& slot = domains_[*path];
+  if (!slot) slot = std::make_unique<Domain>(*path, user == PreferencesUser::kCurrentUser);
+  return slot.get();
+}
+
+bool PreferenceStore::Refresh(Domain& domain) {
+  if (domain.loaded && file_system_->Stat(domain.path) == domain.stamp) return true;
+  FileContents contents = file_system_->Read(domain.path);
+  switch (contents.status) {
+    case ReadStatus::kError:
+      return false;
+    case ReadStatus::kMissing:
+      domain.base.clear();
+      domain.stamp.reset();
+      domain.corrupt = false;
+      break;
+    case ReadStatus::kOk: {
+      std::optional<plist::Value> parsed = plist::ParsePropertyList(contents.bytes);
+      plist::Dictionary* dictionary = parsed ? parsed->AsDictionary() : nullptr;
+      domain.corrupt = dictionary == nullptr;
+      domain.base = dictionary ? std::move(*dictionary) : plist::Dictionary();
+      domain.stamp = contents.stamp;
+      break;
+    }
+  }
+  domain.loaded = true;
+  return true;
+}
+
+bool PreferenceStore::MoveCorruptFileAside(const Domain& domain) {
+  const std::string stem = domain.path.string() + ".corrupt-" + std::to_string(file_system_->UnixTime());
+  if (file_system_->RenameNoReplace(domain.path, stem)) return true;
+  for (int n = 1; n < 100; ++n) {
+    if (file_system_->RenameNoReplace(domain.path, stem + "-" + std::to_string(n))) return true;
+  }
+  return false;
+}
+
+bool PreferenceStore::WritePending(Domain& domain) {
+  if (!file_system_->CreateDirectories(domain.path.parent_path())) return false;
+  std::filesystem::path lock_path = domain.path;
+  lock_path += ".lock";
+  std::optional<FileLock> lock = file_system_->LockExclusive(lock_path);
+  if (!lock) return false;
+  // Under the lock nobody else replaces the file, so the stamp check is exact.
+  if (!Refresh(domain)) return false;
+  if (domain.corrupt) {
+    if (!MoveCorruptFileAside(domain)) return false;
+    domain.corrupt = false;
+    domain.stamp.reset();
+  }
+  plist::Dictionary merged = domain.View();
+  if (!file_system_->ReplaceAtomically(domain.path, plist::SerializeBinaryPropertyList(merged))) return false;
+  domain.base = std::move(merged);
+  domain.pending.clear();
+  domain.stamp = file_system_->Stat(domain.path);
+  return true;
+}
+
+std::optional<plist::Value> PreferenceStore::CopyValue(std::string_view key, std::string_view domain,
+                                                       PreferencesUser user, PreferencesHost host) {
+  Domain* d = Find(domain, user, host);
+  if (d == nullptr) return std::nullopt;
+  std::lock_guard lock(d->mutex);
+  if (!d->loaded) Refresh(*d);
+  const plist::Value* value = d->Lookup(key);
+  return value ? std::optional<plist::Value>(*value) : std::nullopt;
+}
+
+void PreferenceStore::SetValue(std::string_view key, std::optional<plist::Value> value, std::string_view domain,
+                               PreferencesUser user, PreferencesHost host) {
+  Domain* d = Find(domain, user, host);
+  if (d == nullptr || !d->writable) return;
+  std::lock_guard lock(d->mutex);
+  if (!d->loaded) Refresh(*d);
+  d->pending.insert_or_assign(std::string(key), std::move(value));
+}
+
+bool PreferenceStore::Synchronize(std::string_view domain, PreferencesUser user, PreferencesHost host) {
+  Domain* d = Find(domain, user, host);
+  if (d == nullptr) return false;
+  std::lock_guard lock(d->mutex);
+  if (d->pending.empty()) return Refresh(*d);
+  return WritePending(*d);
+}
+
+std::vector<std::string> PreferenceStore::CopyKeyList(std::string_view domain, PreferencesUser user,
+                                                      PreferencesHost host) {
+  std::vector<std::string> keys;
+  for (auto& [key, value] : CopyDomain(domain, user, host)) keys.push_back(key);
+  return keys;
+}
+
+plist::Dictionary PreferenceStore::CopyDomain(std::string_view domain, PreferencesUser user, PreferencesHost host) {
+  Domain* d = Find(domain, user, host);
+  if (d == nullptr) return {};
+  std::lock_guard lock(d->mutex);
+  if (!d->loaded) Refresh(*d);
+  return d->View();
+}
+
+}  // namespace lumeris
