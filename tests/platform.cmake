@@ -9,3 +9,13 @@ lumeris_add_gtest(preference_store_test
   SOURCES platform/preference_store_test.cc
   LIBS lumeris_preferences
   LABELS platform)
+
+lumeris_add_gtest(distributed_notifications_test
+  SOURCES platform/distributed_notifications_test.cc
+  LIBS lumeris_notifications lumeris_viewer_names
+  LABELS platform dbus)
+
+lumeris_add_gtest(preference_reliability_test
+  SOURCES platform/preference_reliability_test.cc
+  LIBS lumeris_preferences
+  LABELS platform)
