@@ -1,0 +1,69 @@
+# The resource builder: a library (linked by the tests) and the lumeris-resource-builder program,
+# which the build runs to write the resource bundles under ${LUMERIS_BUILD_SYSTEM_ROOT}.
+add_library(lumeris_resource_builder STATIC
+  resource_builder/category_definitions.cc
+  resource_builder/category_plists.cc
+  resource_builder/character_db.cc
+  resource_builder/character_info.cc
+  resource_builder/cldr_annotations.cc
+  resource_builder/cldr_labels.cc
+  resource_builder/data_notation.cc
+  resource_builder/emoji_test.cc
+  resource_builder/han_language_info.cc
+  resource_builder/icons.cc
+  resource_builder/input_files.cc
+  resource_builder/related_chars.cc
+  resource_builder/related_db.cc
+  resource_builder/resource_build.cc
+  resource_builder/sqlite_file.cc
+  resource_builder/strings_tables.cc
+  resource_builder/ucd_format.cc
+  resource_builder/unicode_data.cc
+  resource_builder/unihan.cc
+  resource_builder/utf8.cc
+  resource_builder/zhuyin.cc)
+target_include_directories(lumeris_resource_builder PUBLIC ${CMAKE_CURRENT_SOURCE_DIR})
+target_link_libraries(lumeris_resource_builder
+  PUBLIC lumeris_plist lumeris_config SQLite::SQLite3
+  PRIVATE ICU::uc pugixml::pugixml BZip2::BZip2 PkgConfig::CAIRO PkgConfig::PANGO Threads::Threads)
+
+add_executable(lumeris-resource-builder resource_builder/main.cc)
+target_link_libraries(lumeris-resource-builder PRIVATE lumeris_resource_builder CLI11::CLI11)
+
+# Inputs: the Debian unicode-data and unicode-cldr-core files the builder reads.
+set(LUMERIS_UNICODE_DIR /usr/share/unicode)
+set(LUMERIS_CLDR_DIR /usr/share/unicode/cldr/common)
+file(GLOB LUMERIS_CLDR_MAIN_FILES ${LUMERIS_CLDR_DIR}/main/*.xml)
+set(LUMERIS_RESOURCE_INPUTS
+  ${LUMERIS_UNICODE_DIR}/UnicodeData.txt
+  ${LUMERIS_UNICODE_DIR}/NameAliases.txt
+  ${LUMERIS_UNICODE_DIR}/Blocks.txt
+  ${LUMERIS_UNICODE_DIR}/Scripts.txt
+  ${LUMERIS_UNICODE_DIR}/Unihan_Readings.txt.bz2
+  ${LUMERIS_UNICODE_DIR}/Unihan_DictionaryLikeData.txt.bz2
+  ${LUMERIS_UNICODE_DIR}/Unihan_IRGSources.txt.bz2
+  ${LUMERIS_UNICODE_DIR}/Unihan_Variants.txt.bz2
+  ${LUMERIS_UNICODE_DIR}/emoji/emoji-test.txt
+  ${LUMERIS_CLDR_DIR}/annotations/en.xml
+  ${LUMERIS_CLDR_DIR}/annotationsDerived/en.xml
+  ${LUMERIS_CLDR_DIR}/supplemental/supplementalData.xml
+  ${LUMERIS_CLDR_MAIN_FILES}
+  ${PROJECT_SOURCE_DIR}/LICENSES/Unicode-DFS-2016.txt)
+
+# Reruns only when the builder or an input changes. Leak checking is off for the run: the
+# font libraries keep process-lifetime caches that a sanitizer build would report.
+set(LUMERIS_RESOURCES_STAMP ${LUMERIS_BUILD_SYSTEM_ROOT}/.resources.stamp)
+add_custom_command(
+  OUTPUT ${LUMERIS_RESOURCES_STAMP}
+  COMMAND ${CMAKE_COMMAND} -E make_directory ${LUMERIS_BUILD_SYSTEM_ROOT}
+  COMMAND ${CMAKE_COMMAND} -E env ASAN_OPTIONS=detect_leaks=0
+          $<TARGET_FILE:lumeris-resource-builder>
+          --output ${LUMERIS_BUILD_SYSTEM_ROOT}
+          --license ${PROJECT_SOURCE_DIR}/LICENSES/Unicode-DFS-2016.txt
+          --unicode-dir ${LUMERIS_UNICODE_DIR}
+          --cldr-dir ${LUMERIS_CLDR_DIR}
+          --stamp ${LUMERIS_RESOURCES_STAMP}
+  DEPENDS lumeris-resource-builder ${LUMERIS_RESOURCE_INPUTS}
+  COMMENT "Building the resource bundles under ${LUMERIS_BUILD_SYSTEM_ROOT}"
+  VERBATIM)
+add_custom_target(lumeris_resources ALL DEPENDS ${LUMERIS_RESOURCES_STAMP})
