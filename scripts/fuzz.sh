@@ -2,7 +2,9 @@
 # scripts/fuzz.sh <target> <seconds> [libFuzzer options...]
 # Configures build/fuzz with clang, ASan+UBSan and libFuzzer (once), builds <target>, and runs it
 # for <seconds> on one process. Seeds come from fuzz/corpus/<target>/ (read only); new inputs go to
-# build/fuzz/corpus/<target>/ and crashes to build/fuzz/artifacts/<target>/.
+# build/fuzz/corpus/<target>/ and crashes to build/fuzz/artifacts/<target>/. The target's own
+# standard error (the platform log) is closed so that log lines do not flood the output; libFuzzer
+# and sanitizer reports still appear.
 set -euo pipefail
 if [[ $# -lt 2 ]]; then
   echo "usage: scripts/fuzz.sh <target> <seconds> [libFuzzer options...]" >&2
@@ -26,7 +28,7 @@ seeds="$top/fuzz/corpus/$target"
 work="$dir/corpus/$target"
 artifacts="$dir/artifacts/$target/"
 mkdir -p "$work" "$artifacts"
-options=(-max_total_time="$seconds" -artifact_prefix="$artifacts" -print_final_stats=1)
+options=(-max_total_time="$seconds" -artifact_prefix="$artifacts" -print_final_stats=1 -close_fd_mask=2)
 dict="$top/fuzz/$(basename "$target" _fuzz | sed 's/^lumeris_//').dict"
 [[ -f "$dict" ]] && options+=(-dict="$dict")
 inputs=("$work")

@@ -1,7 +1,11 @@
 #include "text/replacement_dictionary.h"
 
+#include <algorithm>
+#include <string_view>
+
 #include "text/emoji.h"
 #include "text/emoji_tables.h"
+#include "text/scalar.h"
 
 namespace lumeris {
 namespace {
@@ -16,9 +20,10 @@ std::optional<icu::UnicodeString> ReplacementDictionaryNormalizedKeyString(
   const uint32_t base = ContainedDiversityUnicode(text);
   if (base == 0) return std::nullopt;
   // ContainedDiversityUnicode accepts at most two scalar values, so the string fits.
+  const std::u16string_view source = UnitsOf(text);
   char16_t units[kMaxKeyUnits];
-  int32_t n = text.length();
-  text.extract(0, n, units, kMaxKeyUnits);
+  std::copy(source.begin(), source.end(), units);
+  auto n = static_cast<int32_t>(source.size());
   const bool skin_tone =
       n >= 3 && units[n - 2] == 0xD83C && units[n - 1] >= 0xDFFB && units[n - 1] <= 0xDFFF;
   if (skin_tone) n -= 2;
