@@ -119,8 +119,9 @@ std::string NameWithoutSkinTones(std::string_view name) {
 std::vector<std::u32string> LetterGroups(const UnicodeCharacterTable& unicode) {
   CodePointSets sets;
   for (const CodePointRecord& record : unicode.records()) {
-    if (!IsLetterOrDigit(&record)) continue;
+    // Any character that is a form of a letter or digit (Ⓐ is a symbol) joins it.
     if (std::optional<char32_t> base = BaseLetter(unicode, record)) sets.Join(record.code_point, *base);
+    if (!IsLetterOrDigit(&record)) continue;
     for (char32_t other : {record.simple_uppercase, record.simple_lowercase}) {
       if (other != 0 && IsLetterOrDigit(unicode.Find(other))) sets.Join(record.code_point, other);
     }
