@@ -123,12 +123,6 @@ TEST_F(BundleTest, CodeFindsOldStyleFolder) {
   EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "en"), file);
 }
 
-TEST_F(BundleTest, OwnFolderBeatsItsAlias) {
-  app_.WriteResource("en", "Note.txt", "x");
-  const fs::path own = app_.WriteResource("English", "Note.txt", "x");
-  EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "English"), own);
-}
-
 TEST_F(BundleTest, LanguagesWithoutMatchUseDevelopmentLocalization) {
   testing::SetUserLanguages(env_, "ja");
   const fs::path en = app_.WriteResource("en", "Note.txt", "x");

@@ -118,13 +118,6 @@ TEST_F(LocalizationLookupTest, DefaultTableReloadsEveryTime) {
   EXPECT_EQ(counter_.loads(TableFile("de", "Localizable")), 2);
 }
 
-TEST_F(LocalizationLookupTest, ExplicitLocalizableTableIsCachedLikeAnyNamedTable) {
-  const Bundle app = Open(app_);
-  Lookup("Smileys", app, "de", "Localizable");
-  Lookup("Animals", app, "de", "Localizable");
-  EXPECT_EQ(counter_.loads(TableFile("de", "Localizable")), 1);
-}
-
 TEST_F(LocalizationLookupTest, NewLocalizationReplacesTheEntry) {
   const Bundle app = Open(app_);
   Lookup("Smileys", app, "de", "Emoji_Category");
