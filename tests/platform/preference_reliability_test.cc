@@ -1,6 +1,7 @@
 // The preference store under real concurrency: forked writer processes, threads inside them,
 // and writers killed with SIGKILL in the middle of their work.
 #include <gtest/gtest.h>
+#include <poll.h>
 #include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -71,7 +72,7 @@ TEST_F(PreferenceReliabilityTest, ConcurrentProcessesAndThreadsKeepEveryKeysLast
   constexpr int kProcesses = 4;
   constexpr int kThreads = 4;
   constexpr int kKeys = 500;
-  constexpr int kSetsPerSynchronize = 125;
+  constexpr int kSetsPerSynchronize = 250;
   auto key_of = [](int p, int t, int k) {
     return "p" + std::to_string(p) + "t" + std::to_string(t) + "k" + std::to_string(k);
   };
@@ -119,18 +120,25 @@ TEST_F(PreferenceReliabilityTest, WriterKilledAtRandomMomentsNeverTearsTheFile) 
   // Each writer stores one generation in all of its keys per synchronise, starting from the
   // generation already in the file: a torn or lost write shows as keys that disagree or a
   // generation that goes back.
-  auto writer = [](const std::string& prefix) {
-    return [prefix](PreferenceStore& store) {
+  // `progress`, when not -1, gets one byte after the writer's first completed synchronise.
+  // `pause` leaves the lock free for a moment between writes.
+  auto writer = [](const std::string& prefix, int progress = -1, std::chrono::microseconds pause = {}) {
+    return [prefix, progress, pause](PreferenceStore& store) mutable {
       Synchronize(store);
       std::int64_t generation = IntegerOf(store, prefix + "0");
       while (true) {
         ++generation;
         for (int i = 0; i < kKeysPerWriter; ++i) Set(store, prefix + std::to_string(i), Value(generation));
         if (!Synchronize(store)) return false;
+        if (progress >= 0) {
+          [[maybe_unused]] ssize_t ignored = write(progress, "w", 1);
+          progress = -1;
+        }
+        std::this_thread::sleep_for(pause);
       }
     };
   };
-  const pid_t steady = StartWriter(writer("steady"));
+  const pid_t steady = StartWriter(writer("steady", -1, std::chrono::microseconds(500)));
   ASSERT_GT(steady, 0);
 
   std::mt19937 random(12345);
@@ -140,8 +148,19 @@ TEST_F(PreferenceReliabilityTest, WriterKilledAtRandomMomentsNeverTearsTheFile) 
   int unparsable = 0;
   int went_back = 0;
   for (int kill_count = 0; kill_count < kKills; ++kill_count) {
-    const pid_t victim = StartWriter(writer("killed"));
+    // Every fourth victim is killed only after it completed one write, so kills also land in
+    // the middle of later writes however slow the machine is.
+    int progress[2];
+    ASSERT_EQ(pipe(progress), 0);
+    const bool after_first_write = kill_count % 4 == 3;
+    const pid_t victim = StartWriter(writer("killed", after_first_write ? progress[1] : -1));
     ASSERT_GT(victim, 0);
+    close(progress[1]);
+    if (after_first_write) {
+      pollfd ready = {progress[0], POLLIN, 0};
+      poll(&ready, 1, 10000);
+    }
+    close(progress[0]);
     std::this_thread::sleep_for(std::chrono::microseconds(delay_us(random)));
     kill(victim, SIGKILL);
     int status = 0;
