@@ -11,7 +11,7 @@ namespace {
 
 using text_internal::ScratchBuffer;
 
-// Enough for any string the panel treats as one emoji sequence.
+// Enough for any string the panel compares as one emoji sequence.
 constexpr size_t kInlineScalars = 32;
 
 // Converts `text` into `scalars` and keeps only the entries the flags call significant; returns
@@ -40,6 +40,8 @@ bool IsEmojiFontName(const icu::UnicodeString& font_name) {
 
 uint32_t ContainedDiversityUnicode(const icu::UnicodeString& text) {
   if (text.isEmpty()) return 0;
+  // A scalar takes at most two units, so five or more units always make more than two scalars.
+  if (text.length() > 4) return 0;
   ScratchBuffer<uint32_t, kInlineScalars> scalars(static_cast<size_t>(text.length()));
   const int64_t count = StringToScalerValues(text, scalars.data());
   if (count > 2) return 0;

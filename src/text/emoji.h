@@ -21,7 +21,7 @@ bool IsEmojiFontName(const icu::UnicodeString& font_name);
 // The skin-tone base emoji that `text` holds, or 0. Only a lone emoji or an emoji followed by one
 // modifier or selector qualifies: more than two scalar values give 0, and so does a second scalar
 // U+FE0E (text presentation). When the string holds two base emoji, the one listed first in
-// kSkinToneBaseTable is reported. Allocates nothing for strings of up to 32 units.
+// kSkinToneBaseTable is reported. Allocates nothing.
 uint32_t ContainedDiversityUnicode(const icu::UnicodeString& text);
 
 // True when `value` is one of the 134 characters of kVariantEmojiTable.
@@ -30,7 +30,8 @@ bool IsValidEmojiScalarForVariant(uint32_t value);
 // True when `a` and `b` are equal once skin-tone modifiers (U+1F3FB..U+1F3FF, unless
 // `skin_tones_significant`) and the selectors U+FE0E/U+FE0F (unless `selectors_significant`) are
 // left out of both. Only those exact scalars are left out; other selectors, zero-width joiners and
-// tag characters stay significant. With both flags set it is plain string equality.
+// tag characters stay significant. With both flags set it is plain string equality. Allocates
+// nothing for strings of up to 32 units.
 bool CompareEmojiStrings(const icu::UnicodeString& a, const icu::UnicodeString& b,
                          bool selectors_significant, bool skin_tones_significant);
 
