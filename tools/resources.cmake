@@ -1,6 +1,6 @@
 # The resource builder: a library (linked by the tests) and the lumeris-resource-builder program,
 # which the build runs to write the resource bundles under ${LUMERIS_BUILD_SYSTEM_ROOT}.
-add_library(lumeris_resource_builder STATIC
+set(LUMERIS_RESOURCE_BUILDER_SOURCES
   resource_builder/category_definitions.cc
   resource_builder/category_plists.cc
   resource_builder/character_db.cc
@@ -22,13 +22,30 @@ add_library(lumeris_resource_builder STATIC
   resource_builder/unihan.cc
   resource_builder/utf8.cc
   resource_builder/zhuyin.cc)
-target_include_directories(lumeris_resource_builder PUBLIC ${CMAKE_CURRENT_SOURCE_DIR})
-target_link_libraries(lumeris_resource_builder
-  PUBLIC lumeris_plist lumeris_config SQLite::SQLite3
-  PRIVATE ICU::uc pugixml::pugixml BZip2::BZip2 PkgConfig::CAIRO PkgConfig::PANGO Threads::Threads)
 
+function(lumeris_add_resource_builder_library name)
+  add_library(${name} STATIC ${LUMERIS_RESOURCE_BUILDER_SOURCES})
+  target_include_directories(${name} PUBLIC ${CMAKE_CURRENT_SOURCE_DIR})
+  target_link_libraries(${name}
+    PUBLIC lumeris_plist lumeris_config SQLite::SQLite3
+    PRIVATE ICU::uc pugixml::pugixml BZip2::BZip2 PkgConfig::CAIRO PkgConfig::PANGO Threads::Threads)
+endfunction()
+
+# The library the tests link (instrumented in a sanitizer build).
+lumeris_add_resource_builder_library(lumeris_resource_builder)
+
+# The program the build runs. In a sanitizer build its own code is compiled without
+# instrumentation (a second copy of the library), so a full run stays well under a minute; the
+# sanitizers still check that code through the tests above.
 add_executable(lumeris-resource-builder resource_builder/main.cc)
-target_link_libraries(lumeris-resource-builder PRIVATE lumeris_resource_builder CLI11::CLI11)
+if(LUMERIS_SANITIZE)
+  lumeris_add_resource_builder_library(lumeris_resource_builder_uninstrumented)
+  target_compile_options(lumeris_resource_builder_uninstrumented PRIVATE -fno-sanitize=all -O2)
+  target_compile_options(lumeris-resource-builder PRIVATE -fno-sanitize=all)
+  target_link_libraries(lumeris-resource-builder PRIVATE lumeris_resource_builder_uninstrumented CLI11::CLI11)
+else()
+  target_link_libraries(lumeris-resource-builder PRIVATE lumeris_resource_builder CLI11::CLI11)
+endif()
 
 # Inputs: the Debian unicode-data and unicode-cldr-core files the builder reads.
 set(LUMERIS_UNICODE_DIR /usr/share/unicode)
