@@ -8,3 +8,8 @@ lumeris_add_gtest(store_test
     store/store_operations_test.cc
   LIBS lumeris_store
   LABELS store)
+
+lumeris_add_gtest(store_e2e_test
+  SOURCES store/store_e2e_test.cc
+  LIBS lumeris_store lumeris_service_fixture lumeris_notifications lumeris_viewer_names
+  LABELS store e2e dbus)

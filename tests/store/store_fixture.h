@@ -59,44 +59,55 @@ inline plist::Array IDArray(const std::vector<std::string>& strings) {
   return plist::Array(strings.begin(), strings.end());
 }
 
+// The file of `domain` for the current user, any host.
+inline std::filesystem::path DomainFile(std::string_view domain) {
+  return *PreferencesFilePath(domain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
+}
+
+// Writes `contents` as the whole file of `domain`, as a new file renamed into place so that a
+// store that has read the old one sees the change.
+inline void SeedDomain(std::string_view domain, const plist::Dictionary& contents) {
+  const std::filesystem::path path = DomainFile(domain);
+  std::filesystem::create_directories(path.parent_path());
+  const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(plist::Value(contents));
+  std::filesystem::path temporary = path;
+  temporary += ".seed";
+  std::ofstream(temporary, std::ios::binary)
+      .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+  std::filesystem::rename(temporary, path);
+}
+
+// The file of `domain` as it is on disk (empty when missing).
+inline plist::Dictionary StoredDomain(std::string_view domain = kStoreDomain) {
+  std::optional<plist::Value> file = plist::ReadPropertyListFile(DomainFile(domain));
+  if (!file || !file->AsDictionary()) return {};
+  return *file->AsDictionary();
+}
+
+inline std::optional<plist::Value> StoredValue(std::string_view key) {
+  plist::Dictionary domain = StoredDomain();
+  auto found = domain.find(key);
+  if (found == domain.end()) return std::nullopt;
+  return found->second;
+}
+
+// The string entries of the list stored under `key`; std::nullopt when none is stored.
+inline std::optional<std::vector<std::string>> StoredList(std::string_view key) {
+  return StringsOf(StoredValue(key));
+}
+
 class StoreTest : public ::testing::Test {
  protected:
   StoreTest() : sink_([this] { ++posts_; }) {}
 
-  static std::filesystem::path DomainFile(std::string_view domain) {
-    return *PreferencesFilePath(domain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
-  }
-
-  // Writes `contents` as the whole file of `domain`. 
   static void seedDomain(std::string_view domain, const plist::Dictionary& contents) {
-    const std::filesystem::path path = DomainFile(domain);
-    std::filesystem::create_directories(path.parent_path());
-    const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(plist::Value(contents));
-    // A new file renamed into place, so a store that has read the old one sees the change.
-    std::filesystem::path temporary = path;
-    temporary += ".seed";
-    std::ofstream(temporary, std::ios::binary)
-        .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
-    std::filesystem::rename(temporary, path);
+    SeedDomain(domain, contents);
   }
-  static void seedStore(const plist::Dictionary& contents) { seedDomain(kStoreDomain, contents); }
+  static void seedStore(const plist::Dictionary& contents) { SeedDomain(kStoreDomain, contents); }
+  static plist::Dictionary storedDomain(std::string_view domain = kStoreDomain) { return StoredDomain(domain); }
+  static std::optional<plist::Value> storedValue(std::string_view key) { return StoredValue(key); }
+  static std::optional<std::vector<std::string>> storedList(std::string_view key) { return StoredList(key); }
 
-  // The file of `domain` as it is on disk (empty when missing).
-  static plist::Dictionary storedDomain(std::string_view domain = kStoreDomain) {
-    std::optional<plist::Value> file = plist::ReadPropertyListFile(DomainFile(domain));
-    if (!file || !file->AsDictionary()) return {};
-    return *file->AsDictionary();
-  }
-  static std::optional<plist::Value> storedValue(std::string_view key) {
-    plist::Dictionary domain = storedDomain();
-    auto found = domain.find(key);
-    if (found == domain.end()) return std::nullopt;
-    return found->second;
-  }
-  // The string entries of the list stored under `key`; std::nullopt when none is stored.
-  static std::optional<std::vector<std::string>> storedList(std::string_view key) {
-    return StringsOf(storedValue(key));
-  }
   int posts() const { return posts_.load(); }
   void resetPosts() { posts_ = 0; }
 

@@ -1,0 +1,335 @@
+// The user data store through the real service: requests over the socket, the preference files
+// on disk, and the change notifications on the private session bus.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <set>
+#include <thread>
+
+#include "platform/distributed_notifications.h"
+#include "support/service_fixture.h"
+#include "store_fixture.h"
+#include "viewer/notification_names.h"
+
+namespace lumeris {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::Optional;
+using testing::Command;
+using testing::EmojiID;
+using testing::PlainID;
+using testing::RawConnection;
+using testing::SeedDomain;
+using testing::StoredDomain;
+using testing::StoredList;
+using testing::StoredValue;
+using StringVector = std::vector<std::string>;
+using namespace std::chrono_literals;
+
+constexpr char kId[] = "test.identifier";
+
+MessageValue Str(std::string text) { return MessageValue::String(std::move(text)); }
+
+MessageValue Strings(const StringVector& strings) {
+  MessageValue array = MessageValue::MakeArray();
+  for (const std::string& text : strings) array.Append(Str(text));
+  return array;
+}
+
+// The strings of a reply's ID array; std::nullopt for null (an empty or absent list).
+std::optional<StringVector> ReplyList(const MessageValue& reply, std::string_view key) {
+  const MessageValue* value = reply.Find(key);
+  if (value == nullptr || value->is_null()) return std::nullopt;
+  StringVector strings;
+  for (const MessageValue& element : *value->AsArray()) strings.push_back(*element.AsString());
+  return strings;
+}
+
+std::optional<std::string> Payload(const MessageValue& reply, std::string_view key) {
+  const MessageValue::Bytes* bytes = reply.GetData(key);
+  if (bytes == nullptr) return std::nullopt;
+  return std::string(bytes->begin(), bytes->end());
+}
+
+class StoreServiceTest : public testing::ServiceTest {
+ protected:
+  void SetUp() override {
+    if (std::getenv("DBUS_SESSION_BUS_ADDRESS") == nullptr) GTEST_SKIP() << "no session bus (source scripts/test-env.sh)";
+    observer_ = DistributedNotificationObserver::Open(kLMLumerisRecentsChangedNotification);
+    ASSERT_TRUE(observer_);
+    ServiceTest::SetUp();
+    connection_.emplace(Connect());
+  }
+
+  // Sends a writing command on the test's connection; it is applied before any later request.
+  void send(MessageValue request) { connection_->SendMessage(request, FrameKind::kNoReply); }
+  // Sends a reading command on the test's connection and returns its reply.
+  MessageValue ask(MessageValue request) {
+    std::optional<MessageValue> reply = connection_->ReadReply(connection_->SendMessage(request), 10s);
+    EXPECT_TRUE(reply) << "no reply to " << request;
+    return reply.value_or(MessageValue::MakeDictionary());
+  }
+  MessageValue readAll(std::string identifier = kId, std::string application = "app") {
+    return ask(Command("read_recents_favorites",
+                       {{"identifier", Str(std::move(identifier))}, {"application", Str(std::move(application))}}));
+  }
+  std::optional<StringVector> read(std::string target, std::string identifier = kId) {
+    return ReplyList(ask(Command("read", {{"target", Str(std::move(target))}, {"identifier", Str(std::move(identifier))}})),
+                   "array");
+  }
+  void add(std::string item, std::string identifier = kId) {
+    send(Command("add", {{"target", Str("recents")}, {"item", Str(std::move(item))}, {"identifier", Str(std::move(identifier))}}));
+  }
+  void set(std::string target, MessageValue array, std::string identifier = kId) {
+    send(Command("set", {{"target", Str(std::move(target))}, {"array", std::move(array)}, {"identifier", Str(std::move(identifier))}}));
+  }
+  void setSkinTone(std::string item) {
+    send(Command("set_skintone", {{"item", Str(std::move(item))}, {"identifier", Str(kId)}}));
+  }
+  void saveState(std::string_view data, std::string application = "app") {
+    send(Command("save_state", {{"data", MessageValue::DataFromBytes(data)}, {"application", Str(std::move(application))}}));
+  }
+  // Waits until every request sent so far has been handled.
+  void settle() { ask(Command("read", {{"target", Str("favorites")}, {"identifier", Str("settle")}})); }
+
+  // The notifications that arrive from now until `quiet` passes without one.
+  std::size_t notifications(std::chrono::milliseconds quiet = 400ms) {
+    settle();
+    std::size_t total = 0;
+    while (std::size_t n = observer_->Run([](const DistributedNotification&) {}, {.max_count = 1, .timeout = quiet})) {
+      total += n;
+    }
+    return total;
+  }
+
+  std::unique_ptr<DistributedNotificationObserver> observer_;
+  std::optional<RawConnection> connection_;
+};
+
+TEST_F(StoreServiceTest, AddingAnExistingItemMovesItToTheFrontWithTheNewText) {
+  for (const std::string& item : {PlainID("a"), EmojiID(testing::kThumbsUp), PlainID("b")}) add(item);
+  add(EmojiID(testing::kThumbsUpDark));
+  EXPECT_THAT(read("recents"), Optional(ElementsAre(EmojiID(testing::kThumbsUpDark), PlainID("b"), PlainID("a"))));
+  EXPECT_EQ(notifications(), 4u);
+  EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
+              Optional(ElementsAre(EmojiID(testing::kThumbsUpDark), PlainID("b"), PlainID("a"))));
+}
+
+TEST_F(StoreServiceTest, TheDefaultIdentifierConvertsTheOlderListsExactlyOnce) {
+  auto old_items = [](const char* character) {
+    return plist::Array{plist::Dictionary{{"String", character}}};
+  };
+  SeedDomain(kInputMethodDomain, {{"VTRecentItems", old_items("R")}});
+  SeedDomain(kOlderServerDomain, {{"SorvexFavorites", old_items("F")}});
+
+  MessageValue first = readAll(std::string(kDefaultDataStorageIdentifier));
+  EXPECT_THAT(ReplyList(first, "recents"), Optional(ElementsAre(PlainID("R"))));
+  EXPECT_THAT(ReplyList(first, "favorites"), Optional(ElementsAre(PlainID("F"))));
+  EXPECT_EQ(StoredValue("VTRecentsConverted"), plist::Value(true));
+  EXPECT_EQ(StoredValue("VTFavoritesConverted"), plist::Value(true));
+  EXPECT_EQ(notifications(), 1u) << "storing the converted recents notifies; favourites do not";
+
+  set("recents", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
+  set("favorites", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
+  MessageValue again = readAll(std::string(kDefaultDataStorageIdentifier));
+  EXPECT_TRUE(again.Find("recents")->is_null());
+  EXPECT_TRUE(again.Find("favorites")->is_null());
+
+  MessageValue other = readAll("other.identifier");
+  EXPECT_TRUE(other.Find("recents")->is_null());
+  EXPECT_TRUE(other.Find("favorites")->is_null());
+  EXPECT_FALSE(StoredValue(StoreKey(kRecentsKeyPrefix, "other.identifier")));
+}
+
+TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstRecentsReadNotByAFavoritesRead) {
+  SeedDomain(kStoreDomain, {{"Favorites:test.identifier", plist::Array{"f"}}, {"Leftover", 1}});
+  EXPECT_THAT(read("favorites"), Optional(ElementsAre("f")));
+  EXPECT_TRUE(StoredDomain().contains("Leftover"));
+
+  EXPECT_FALSE(read("recents"));
+  EXPECT_FALSE(read("favorites"));
+  EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}}}));
+}
+
+TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstWrite) {
+  SeedDomain(kStoreDomain, {{"Recents:test.identifier", plist::Array{"r"}}, {"Leftover", 1}});
+  set("favorites", Strings({"f"}));
+  settle();
+  EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}},
+                                                {"Favorites:test.identifier", plist::Array{"f"}}}));
+  EXPECT_EQ(notifications(), 0u);
+}
+
+TEST_F(StoreServiceTest, HorseRacingWithAModifierIsReadPlainWhileTheStoredTextKeepsIt) {
+  set("recents", Strings({PlainID(testing::kHorseRacingLight), PlainID("a")}));
+  EXPECT_THAT(read("recents"), Optional(ElementsAre(PlainID(testing::kHorseRacing), PlainID("a"))));
+  EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
+              Optional(ElementsAre(PlainID(testing::kHorseRacingLight), PlainID("a"))));
+}
+
+TEST_F(StoreServiceTest, StoringAnEmptyRecentsListRemovesTheSkinTonesAndNotifiesOnce) {
+  set("recents", Strings({EmojiID(testing::kThumbsUpMedium)}));
+  EXPECT_EQ(notifications(), 1u);
+  ASSERT_TRUE(StoredValue(StoreKey(kSkinTonesKeyPrefix, kId)));
+
+  MessageValue only_integers = MessageValue::MakeArray();
+  only_integers.Append(MessageValue::Uint64(7));
+  set("recents", only_integers);
+  EXPECT_EQ(notifications(), 1u);
+  EXPECT_FALSE(StoredValue(StoreKey(kSkinTonesKeyPrefix, kId)));
+  EXPECT_EQ(StoredValue(StoreKey(kRecentsKeyPrefix, kId)), plist::Value(plist::Array{}));
+  MessageValue reply = readAll();
+  EXPECT_TRUE(reply.Find("recents")->is_null());
+  EXPECT_EQ(reply.Find("skintones"), nullptr);
+}
+
+TEST_F(StoreServiceTest, SetSkinToneRecordsOnlySkinToneEmojiInTheEmojiFont) {
+  struct Case {
+    const char* name;
+    std::string item;
+    std::optional<std::string> skintones;  // the reply's "skintones" afterwards
+    std::size_t notifications;
+  };
+  const std::string thumbs = std::string("{\"") + testing::kThumbsUp + "\":\"";
+  const Case cases[] = {
+      {"emoji font, skin tone", EmojiID(testing::kThumbsUpMedium), thumbs + testing::kThumbsUpMedium + "\"}", 1},
+      {"other font", "com.vantorel.lmk:{\"char\":\"" + std::string(testing::kThumbsUpDark) + "\",\"font\":\"Courier\"}",
+       thumbs + testing::kThumbsUpMedium + "\"}", 0},
+      {"no skin tone", EmojiID(testing::kThumbsUp), thumbs + testing::kThumbsUp + "\"}", 1},
+      {"empty", "", std::nullopt, 1},
+  };
+  // Writing the history runs no version check, so the first recents read of an unversioned
+  // domain would wipe it: version the domain first, as the panel's first read does.
+  readAll();
+  for (const Case& c : cases) {
+    setSkinTone(c.item);
+    EXPECT_EQ(notifications(), c.notifications) << c.name;
+    EXPECT_EQ(Payload(readAll(), "skintones"), c.skintones) << c.name;
+  }
+}
+
+TEST_F(StoreServiceTest, SavingOnlyTheGlobalMemberKeepsTheApplicationsStateAndNotifies) {
+  saveState(R"({"tab":1})");
+  EXPECT_EQ(notifications(), 0u);
+  saveState(R"({"VTGlobalEmojiDiversityDescribed":true})");
+  EXPECT_EQ(notifications(), 1u);
+  EXPECT_EQ(Payload(readAll(), "state"), R"({"VTGlobalEmojiDiversityDescribed":true,"tab":1})");
+  EXPECT_EQ(Payload(readAll(kId, "other.app"), "state"), R"({"VTGlobalEmojiDiversityDescribed":true})");
+}
+
+TEST_F(StoreServiceTest, AnEmptyObjectTextThatIsNotJsonOrANullChangeNothing) {
+  saveState(R"({"tab":1})");
+  settle();
+  const plist::Dictionary before = StoredDomain();
+  for (std::string_view data : {R"({})", "not json", R"({"tab":null})", R"([1])"}) saveState(data);
+  EXPECT_EQ(notifications(), 0u);
+  EXPECT_EQ(StoredDomain(), before);
+  EXPECT_EQ(Payload(readAll(), "state"), R"({"tab":1})");
+}
+
+TEST_F(StoreServiceTest, ReadRecentsFavoritesReturnsTheFourValues) {
+  MessageValue empty = readAll();
+  EXPECT_TRUE(empty.Find("recents")->is_null());
+  EXPECT_TRUE(empty.Find("favorites")->is_null());
+  EXPECT_EQ(empty.Find("skintones"), nullptr);
+  EXPECT_EQ(Payload(empty, "state"), "{}");
+
+  add(EmojiID(testing::kThumbsUpMedium));
+  set("favorites", Strings({PlainID("f1"), PlainID("f2")}));
+  saveState(R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})", "app");
+  MessageValue full = readAll();
+  EXPECT_THAT(ReplyList(full, "recents"), Optional(ElementsAre(EmojiID(testing::kThumbsUpMedium))));
+  EXPECT_THAT(ReplyList(full, "favorites"), Optional(ElementsAre(PlainID("f1"), PlainID("f2"))));
+  EXPECT_EQ(Payload(full, "skintones"),
+            "{\"" + std::string(testing::kThumbsUp) + "\":\"" + testing::kThumbsUpMedium + "\"}");
+  EXPECT_EQ(Payload(full, "state"), R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})");
+}
+
+TEST_F(StoreServiceTest, RequestsWithoutIdentifierReadNothingAndWriteNothing) {
+  set("recents", Strings({"kept"}));
+  settle();
+  const plist::Dictionary before = StoredDomain();
+  send(Command("add", {{"target", Str("recents")}, {"item", Str("x")}}));
+  send(Command("set", {{"target", Str("recents")}, {"array", Strings({"y"})}}));
+  send(Command("save_state", {{"data", MessageValue::DataFromBytes(R"({"a":1})")}}));
+  MessageValue reply = ask(Command("read_recents_favorites"));
+  EXPECT_TRUE(reply.Find("recents")->is_null());
+  EXPECT_EQ(Payload(reply, "state"), "{}");
+  EXPECT_EQ(StoredDomain(), before);
+}
+
+// Eight connections add distinct items to one identifier at the same time while a ninth stores
+// favourites. Each add is a read-modify-write of the whole list without a lock, so when two
+// overlap the later store wins and the other's item is dropped: the outcome is a subset of the
+// items, never a mixture of lists. Every add is still applied (it stores and notifies once), the
+// file is never torn (each store replaces it atomically), and keys written by others in the
+// meantime (favourites) survive, because a synchronise merges this process's changes key by key.
+TEST_F(StoreServiceTest, ConcurrentAddsLoseOnlyToTheLastStoreAndKeepOtherKeys) {
+  constexpr int kConnections = 8;
+  constexpr int kAddsEach = 10;
+  std::atomic<bool> adding{true};
+  std::atomic<int> torn_reads{0};
+  std::atomic<int> answered{0};
+
+  std::thread watcher([&] {
+    while (adding) {
+      if (std::filesystem::exists(testing::DomainFile(kStoreDomain)) &&
+          !plist::ReadPropertyListFile(testing::DomainFile(kStoreDomain))) {
+        ++torn_reads;
+      }
+    }
+  });
+  std::vector<std::thread> writers;
+  for (int c = 0; c < kConnections; ++c) {
+    writers.emplace_back([&, c] {
+      RawConnection connection = *RawConnection::Open(socket_path_);
+      for (int n = 0; n < kAddsEach; ++n) {
+        connection.SendMessage(Command("add", {{"target", Str("recents")},
+                                               {"item", Str(PlainID("c" + std::to_string(c) + "-" + std::to_string(n)))},
+                                               {"identifier", Str(kId)}}),
+                               FrameKind::kNoReply);
+      }
+      const std::uint64_t id =
+          connection.SendMessage(Command("read", {{"target", Str("favorites")}, {"identifier", Str("settle")}}));
+      if (connection.ReadReply(id, 30s)) ++answered;
+    });
+  }
+  for (int n = 0; n < kAddsEach; ++n) set("favorites", Strings({"fav-" + std::to_string(n)}));
+  settle();
+  for (std::thread& writer : writers) writer.join();
+  adding = false;
+  watcher.join();
+
+  EXPECT_EQ(answered, kConnections);
+  EXPECT_EQ(torn_reads, 0);
+  std::size_t posted = 0;
+  posted += observer_->Run([](const DistributedNotification&) {},
+                           {.max_count = kConnections * kAddsEach, .timeout = 10s});
+  EXPECT_EQ(posted, static_cast<std::size_t>(kConnections * kAddsEach)) << "every add stored once";
+
+  std::set<std::string> added;
+  for (int c = 0; c < kConnections; ++c) {
+    for (int n = 0; n < kAddsEach; ++n) added.insert(PlainID("c" + std::to_string(c) + "-" + std::to_string(n)));
+  }
+  const std::optional<StringVector> recents = read("recents");
+  ASSERT_TRUE(recents);
+  EXPECT_FALSE(recents->empty());
+  const std::set<std::string> distinct(recents->begin(), recents->end());
+  EXPECT_EQ(distinct.size(), recents->size()) << "no entry twice";
+  for (const std::string& entry : *recents) EXPECT_TRUE(added.contains(entry)) << entry;
+  EXPECT_THAT(read("favorites"), Optional(ElementsAre("fav-" + std::to_string(kAddsEach - 1))));
+
+  // Once the writers are quiet nothing more is lost: one more add keeps every entry.
+  add(PlainID("after"));
+  const std::optional<StringVector> after = read("recents");
+  ASSERT_TRUE(after);
+  ASSERT_EQ(after->size(), recents->size() + 1);
+  EXPECT_EQ(after->front(), PlainID("after"));
+  EXPECT_TRUE(std::equal(recents->begin(), recents->end(), after->begin() + 1));
+}
+
+}  // namespace
+}  // namespace lumeris
