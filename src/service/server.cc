@@ -50,6 +50,7 @@ class AsioConnection final : public ServiceConnection,
 
   // Closes the socket and releases the handler without an event. REQUIRES: the pool is stopped.
   void Abandon() {
+    closed_ = true;
     asio::error_code ignored;
     socket_.close(ignored);
     handler_ = nullptr;
@@ -198,20 +199,25 @@ class ServiceServer::Impl {
 
   void Stop() {
     if (threads_.empty()) return;
-    asio::error_code ignored;
-    asio::post(io_, [this] {
-      asio::error_code ignored_close;
-      acceptor_.close(ignored_close);
-    });
     work_.reset();
     io_.stop();
     for (std::thread& thread : threads_) thread.join();
     threads_.clear();
-    std::lock_guard<std::mutex> hold(connections_mutex_);
-    for (const std::weak_ptr<AsioConnection>& weak : connections_) {
+    // No thread runs handlers now: close everything from here.
+    asio::error_code ignored;
+    acceptor_.close(ignored);
+    std::vector<std::weak_ptr<AsioConnection>> connections;
+    {
+      std::lock_guard<std::mutex> hold(connections_mutex_);
+      connections.swap(connections_);
+    }
+    for (const std::weak_ptr<AsioConnection>& weak : connections) {
       if (std::shared_ptr<AsioConnection> connection = weak.lock()) connection->Abandon();
     }
-    connections_.clear();
+    // Run the aborted operations, which hold the last references to the connections. An accept
+    // that completed meanwhile finds the acceptor closed and drops its socket.
+    io_.restart();
+    io_.poll();
   }
 
  private:

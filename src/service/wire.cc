@@ -2,6 +2,7 @@
 
 #include <msgpack.hpp>
 
+#include <cstring>
 #include <limits>
 #include <utility>
 #include <vector>
@@ -36,7 +37,19 @@ struct StringSink {
   void write(const char* data, std::size_t size) { out.append(data, size); }
 };
 
-void PackValue(msgpack::packer<StringSink>& packer, const MessageValue& value) {
+// Always float 64: msgpack-c's pack_double() writes integral doubles as integers, which would
+// turn a double into a uint64 or int64 on the other side.
+void PackFloat64(StringSink& sink, double value) {
+  std::uint64_t bits;
+  std::memcpy(&bits, &value, sizeof bits);
+  char bytes[9];
+  bytes[0] = static_cast<char>(0xcb);
+  for (int i = 0; i < 8; ++i) bytes[1 + i] = static_cast<char>(bits >> (56 - 8 * i));
+  sink.write(bytes, sizeof bytes);
+}
+
+// `packer` writes straight into `sink`, so both may be used in turn.
+void PackValue(msgpack::packer<StringSink>& packer, StringSink& sink, const MessageValue& value) {
   switch (value.kind()) {
     case MessageValue::Kind::kNull:
       packer.pack_nil();
@@ -55,7 +68,7 @@ void PackValue(msgpack::packer<StringSink>& packer, const MessageValue& value) {
       packer.pack_int64(*value.AsInt64());
       return;
     case MessageValue::Kind::kDouble:
-      packer.pack_double(*value.AsDouble());
+      PackFloat64(sink, *value.AsDouble());
       return;
     case MessageValue::Kind::kString: {
       const std::string& text = *value.AsString();
@@ -73,7 +86,7 @@ void PackValue(msgpack::packer<StringSink>& packer, const MessageValue& value) {
     case MessageValue::Kind::kArray: {
       const MessageValue::Array& elements = *value.AsArray();
       packer.pack_array(static_cast<std::uint32_t>(elements.size()));
-      for (const MessageValue& element : elements) PackValue(packer, element);
+      for (const MessageValue& element : elements) PackValue(packer, sink, element);
       return;
     }
     case MessageValue::Kind::kDictionary: {
@@ -82,7 +95,7 @@ void PackValue(msgpack::packer<StringSink>& packer, const MessageValue& value) {
       for (const auto& [key, element] : entries) {
         packer.pack_str(static_cast<std::uint32_t>(key.size()));
         packer.pack_str_body(key.data(), static_cast<std::uint32_t>(key.size()));
-        PackValue(packer, element);
+        PackValue(packer, sink, element);
       }
       return;
     }
@@ -97,7 +110,7 @@ void AppendEncodedFrame(const Frame& frame, std::string& out) {
   packer.pack_array(3);
   packer.pack_uint64(static_cast<std::uint64_t>(frame.kind));
   packer.pack_uint64(frame.id);
-  PackValue(packer, frame.body);
+  PackValue(packer, sink, frame.body);
 }
 
 std::string EncodeFrame(const Frame& frame) {
@@ -110,7 +123,7 @@ std::string EncodeMessageValue(const MessageValue& value) {
   std::string out;
   StringSink sink{out};
   msgpack::packer<StringSink> packer(sink);
-  PackValue(packer, value);
+  PackValue(packer, sink, value);
   return out;
 }
 

@@ -1,0 +1,12 @@
+# systemd user units: the socket starts lumeris-fileservice on the first connection.
+# The service unit names the installed program, so it is configured with the install path.
+set(LUMERIS_SYSTEMD_USER_UNIT_DIR "${CMAKE_INSTALL_PREFIX}/lib/systemd/user"
+    CACHE PATH "Where the systemd user units are installed")
+set(LUMERIS_UNITS_DIR ${CMAKE_CURRENT_BINARY_DIR}/systemd)
+configure_file(${CMAKE_CURRENT_LIST_DIR}/com.vantorel.Lumeris.FileService.service
+               ${LUMERIS_UNITS_DIR}/com.vantorel.Lumeris.FileService.service @ONLY)
+configure_file(${CMAKE_CURRENT_LIST_DIR}/com.vantorel.Lumeris.FileService.socket
+               ${LUMERIS_UNITS_DIR}/com.vantorel.Lumeris.FileService.socket COPYONLY)
+install(FILES ${LUMERIS_UNITS_DIR}/com.vantorel.Lumeris.FileService.service
+              ${LUMERIS_UNITS_DIR}/com.vantorel.Lumeris.FileService.socket
+        DESTINATION ${LUMERIS_SYSTEMD_USER_UNIT_DIR})

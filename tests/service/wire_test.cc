@@ -1,0 +1,187 @@
+// The frame codec: value mapping both ways, streaming, and every kind of malformed input.
+#include "service/wire.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+namespace lumeris {
+namespace {
+
+MessageValue SampleBody() {
+  return MessageValue::MakeDictionary({
+      {"null", MessageValue::Null()},
+      {"true", MessageValue::Bool(true)},
+      {"false", MessageValue::Bool(false)},
+      {"zero", MessageValue::Uint64(0)},
+      {"u8", MessageValue::Uint64(200)},
+      {"u64", MessageValue::Uint64(UINT64_MAX)},
+      {"negative", MessageValue::Int64(-1)},
+      {"int64 min", MessageValue::Int64(INT64_MIN)},
+      {"double", MessageValue::Double(-2.5)},
+      {"integral double", MessageValue::Double(5.0)},
+      {"negative integral double", MessageValue::Double(-3.0)},
+      {"string", MessageValue::String("text")},
+      {"invalid utf-8", MessageValue::String("\xff\xc3(")},
+      {"embedded nul", MessageValue::String(std::string("a\0b", 3))},
+      {"data", MessageValue::DataFromBytes(std::string("\0\x01\xff", 3))},
+      {"empty data", MessageValue::Data({})},
+      {"array", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::MakeArray(),
+                                         MessageValue::MakeDictionary()})},
+      {"", MessageValue::String("empty key")},
+  });
+}
+
+std::vector<Frame> DecodeAll(FrameDecoder& decoder) {
+  std::vector<Frame> frames;
+  while (std::optional<Frame> frame = decoder.Next()) frames.push_back(std::move(*frame));
+  return frames;
+}
+
+TEST(Wire, FramesRoundTripWhateverTheChunking) {
+  const Frame sent[] = {{FrameKind::kNoReply, 0, SampleBody()},
+                        {FrameKind::kWantsReply, UINT64_MAX, MessageValue::MakeDictionary()},
+                        {FrameKind::kReply, 7, SampleBody()}};
+  std::string stream;
+  for (const Frame& frame : sent) AppendEncodedFrame(frame, stream);
+  for (std::size_t chunk : {std::size_t{1}, std::size_t{3}, std::size_t{64}, stream.size()}) {
+    FrameDecoder decoder;
+    std::vector<Frame> received;
+    for (std::size_t offset = 0; offset < stream.size(); offset += chunk) {
+      decoder.Feed(std::string_view(stream).substr(offset, chunk));
+      for (Frame& frame : DecodeAll(decoder)) received.push_back(std::move(frame));
+    }
+    ASSERT_FALSE(decoder.error()) << chunk;
+    EXPECT_FALSE(decoder.Finish()) << chunk;
+    ASSERT_EQ(received.size(), 3u) << chunk;
+    for (std::size_t i = 0; i < 3; ++i) {
+      EXPECT_EQ(received[i].kind, sent[i].kind);
+      EXPECT_EQ(received[i].id, sent[i].id);
+      EXPECT_EQ(received[i].body, sent[i].body) << chunk;
+    }
+  }
+}
+
+// Decodes one frame [1, 1, {"v": <value bytes>}] and returns "v".
+std::optional<MessageValue> DecodeValue(const std::string& value_bytes) {
+  FrameDecoder decoder;
+  decoder.Feed(std::string("\x93\x01\x01\x81\xa1v", 6) + value_bytes);
+  std::optional<Frame> frame = decoder.Next();
+  if (!frame) return std::nullopt;
+  return *frame->body.Find("v");
+}
+
+TEST(Wire, IntegerAndFloatFormatsMapToTheirKinds) {
+  struct Case {
+    const char* name;
+    std::string bytes;
+    MessageValue expected;
+  };
+  const Case cases[] = {
+      {"positive fixint", "\x05", MessageValue::Uint64(5)},
+      {"uint16", std::string("\xcd\x01\x00", 3), MessageValue::Uint64(256)},
+      {"int8 positive", std::string("\xd0\x05", 2), MessageValue::Uint64(5)},
+      {"int64 positive", std::string("\xd3\0\0\0\0\0\0\0\x07", 9), MessageValue::Uint64(7)},
+      {"negative fixint", "\xff", MessageValue::Int64(-1)},
+      {"int16 negative", std::string("\xd1\xff\x00", 3), MessageValue::Int64(-256)},
+      {"float32", std::string("\xca\x3f\xc0\x00\x00", 5), MessageValue::Double(1.5)},
+      {"str8", std::string("\xd9\x02hi", 4), MessageValue::String("hi")},
+      {"bin8", std::string("\xc4\x01\x00", 3), MessageValue::DataFromBytes(std::string("\0", 1))},
+  };
+  for (const Case& c : cases) {
+    std::optional<MessageValue> value = DecodeValue(c.bytes);
+    ASSERT_TRUE(value) << c.name;
+    EXPECT_EQ(*value, c.expected) << c.name;
+  }
+}
+
+std::string Nested(std::size_t depth) {
+  return std::string(depth, '\x91') + '\xc0';
+}
+
+TEST(Wire, DepthCountsEveryContainerUpToSixtyFour) {
+  // The envelope and the body are two of the 64.
+  EXPECT_TRUE(DecodeValue(Nested(62)));
+  FrameDecoder decoder;
+  decoder.Feed(std::string("\x93\x01\x01\x81\xa1v", 6) + Nested(63));
+  EXPECT_FALSE(decoder.Next());
+  EXPECT_EQ(decoder.error(), FrameError::kTooDeep);
+}
+
+TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
+  struct Case {
+    const char* name;
+    std::string bytes;
+    FrameError error;
+  };
+  const std::string envelope("\x93\x01\x01", 3);
+  const Case cases[] = {
+      {"never-used byte", std::string("\xc1", 1), FrameError::kBadMessagePack},
+      {"bare map", std::string("\x80", 1), FrameError::kBadEnvelope},
+      {"two elements", std::string("\x92\x01\x80", 3), FrameError::kBadEnvelope},
+      {"four elements", std::string("\x94\x01\x01\x80\xc0", 5), FrameError::kBadEnvelope},
+      {"kind 3", std::string("\x93\x03\x01\x80", 4), FrameError::kBadEnvelope},
+      {"kind as string", std::string("\x93\xa1" "1" "\x01\x80", 5), FrameError::kBadEnvelope},
+      {"negative id", std::string("\x93\x01\xff\x80", 4), FrameError::kBadEnvelope},
+      {"array body", std::string("\x93\x01\x01\x90", 4), FrameError::kBadEnvelope},
+      {"integer key", envelope + std::string("\x81\x01\xc0", 3), FrameError::kNonStringKey},
+      {"nil key", envelope + std::string("\x81\xc0\xc0", 3), FrameError::kNonStringKey},
+      {"bin key", envelope + std::string("\x81\xc4\x01k\xc0", 5), FrameError::kNonStringKey},
+      {"map key", envelope + std::string("\x81\x80\xc0", 3), FrameError::kNonStringKey},
+      {"nested integer key", envelope + std::string("\x81\xa1v\x81\x02\xc0", 6),
+       FrameError::kNonStringKey},
+      {"fixext", envelope + std::string("\x81\xa1v\xd4\x01\x00", 6), FrameError::kExtValue},
+      {"ext8 in array", envelope + std::string("\x81\xa1v\x91\xc7\x01\x05\x00", 8),
+       FrameError::kExtValue},
+  };
+  for (const Case& c : cases) {
+    FrameDecoder decoder;
+    decoder.Feed(c.bytes);
+    EXPECT_FALSE(decoder.Next()) << c.name;
+    EXPECT_EQ(decoder.error(), c.error) << c.name;
+    // Once failed, the decoder stays failed.
+    decoder.Feed(EncodeFrame(Frame{}));
+    EXPECT_FALSE(decoder.Next()) << c.name;
+  }
+}
+
+TEST(WireErrors, FrameOverSixteenMebibytesIsTooBig) {
+  // bin32 header claiming 16 MiB: with the envelope the frame exceeds the limit, which the
+  // decoder notices before the last byte arrives.
+  std::string header("\x93\x01\x01\x81\xa1v\xc6\x01\x00\x00\x00", 11);
+  FrameDecoder decoder;
+  decoder.Feed(header);
+  decoder.Feed(std::string(kMaxFrameBytes - header.size() + 1, 'x'));
+  EXPECT_FALSE(decoder.Next());
+  EXPECT_EQ(decoder.error(), FrameError::kTooBig);
+
+  // Just under the limit is fine.
+  const std::size_t payload = kMaxFrameBytes - header.size();
+  std::string fits("\x93\x01\x01\x81\xa1v\xc6", 7);
+  for (int shift = 24; shift >= 0; shift -= 8) fits += static_cast<char>((payload >> shift) & 0xff);
+  fits += std::string(payload, 'y');
+  ASSERT_EQ(fits.size(), kMaxFrameBytes);
+  FrameDecoder fitting;
+  fitting.Feed(fits);
+  EXPECT_TRUE(fitting.Next());
+  EXPECT_FALSE(fitting.error());
+}
+
+TEST(WireErrors, StreamEndingInsideAFrameIsTruncated) {
+  const std::string frame = EncodeFrame(Frame{FrameKind::kWantsReply, 1, MessageValue::MakeDictionary(
+                                                  {{"k", MessageValue::String("value")}})});
+  for (std::size_t cut : {std::size_t{1}, frame.size() / 2, frame.size() - 1}) {
+    FrameDecoder decoder;
+    decoder.Feed(std::string_view(frame).substr(0, cut));
+    EXPECT_FALSE(decoder.Next());
+    EXPECT_FALSE(decoder.error());
+    EXPECT_EQ(decoder.Finish(), FrameError::kTruncated) << cut;
+  }
+  FrameDecoder whole;
+  whole.Feed(frame);
+  EXPECT_TRUE(whole.Next());
+  EXPECT_FALSE(whole.Finish());
+}
+
+}  // namespace
+}  // namespace lumeris
