@@ -1,0 +1,211 @@
+// Round trips of the user data store through the real service, and the file write they are
+// measured against.
+//
+//   AddRoundTrip/N     "add" of an entry already in an N-entry recents list (it moves to the
+//                      front, so the list keeps its length and every add walks the whole list),
+//                      then a small "read" as the fence that shows the add has been applied
+//   FenceRoundTrip     that fence alone (an empty favourites list), to subtract
+//   ReadRoundTrip/N    "read" of the N-entry recents list
+//   FsyncedWrite/N     the same domain's bytes written to a temporary file, fsync'd, renamed
+//
+// Each benchmark reports p50_us and p90_us over its iterations. The service runs in a scratch
+// HOME/XDG environment; run inside scripts/test-env.sh so that its notifications have a bus.
+#include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <signal.h>
+#include <spawn.h>
+#include <stdlib.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
+#include <filesystem>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "client/service_client.h"
+#include "platform/property_list_io.h"
+#include "service/socket_path.h"
+#include "text/utf8.h"
+
+extern char** environ;
+
+namespace lumeris {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+// A scratch user environment and the service program running in it, for the whole process.
+class BenchService {
+ public:
+  static BenchService& Get() {
+    static BenchService service;
+    return service;
+  }
+  ServiceClient* client() { return client_.get(); }
+  const std::filesystem::path& root() const { return root_; }
+
+  ~BenchService() {
+    client_.reset();
+    if (pid_ > 0) {
+      kill(pid_, SIGTERM);
+      waitpid(pid_, nullptr, 0);
+    }
+    std::filesystem::remove_all(root_);
+  }
+
+ private:
+  BenchService() {
+    std::string pattern = (std::filesystem::temp_directory_path() / "lumeris-store-bench-XXXXXX").string();
+    root_ = mkdtemp(pattern.data());
+    for (const char* sub : {"home", "config", "runtime"}) std::filesystem::create_directories(root_ / sub);
+    chmod((root_ / "runtime").c_str(), 0700);
+    setenv("HOME", (root_ / "home").c_str(), 1);
+    setenv("XDG_CONFIG_HOME", (root_ / "config").c_str(), 1);
+    setenv("XDG_RUNTIME_DIR", (root_ / "runtime").c_str(), 1);
+
+    const char* program = getenv("LUMERIS_FILESERVICE");
+    std::string path = program && *program ? program : LUMERIS_BENCH_FILESERVICE;
+    char* argv[] = {path.data(), nullptr};
+    if (posix_spawn(&pid_, path.c_str(), nullptr, nullptr, argv, environ) != 0) pid_ = -1;
+
+    ServiceClientOptions options;
+    options.socket_path = ServiceSocketPath();
+    options.start_on_demand = false;
+    const auto deadline = Clock::now() + std::chrono::seconds(5);
+    while (!client_ && Clock::now() < deadline) {
+      client_ = ServiceClient::Connect(options);
+      if (!client_) std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    }
+  }
+
+  std::filesystem::path root_;
+  pid_t pid_ = -1;
+  std::unique_ptr<ServiceClient> client_;
+};
+
+MessageValue Request(std::string command, std::vector<std::pair<std::string, MessageValue>> more) {
+  MessageValue request = MessageValue::MakeDictionary();
+  request.Set("command", MessageValue::String(std::move(command)));
+  for (auto& [key, value] : more) request.Set(key, std::move(value));
+  return request;
+}
+
+// N distinct current-form entity IDs (CJK ideographs, as the panel records plain characters).
+std::vector<std::string> EntityIDs(int count) {
+  std::vector<std::string> ids;
+  for (int n = 0; n < count; ++n) {
+    icu::UnicodeString character(static_cast<UChar32>(0x4E00 + n));
+    ids.push_back("com.vantorel.lmk:{\"char\":\"" + EncodeUtf8Lenient(character) + "\"}");
+  }
+  return ids;
+}
+
+std::string Identifier(int count) { return "bench." + std::to_string(count); }
+
+// Stores `ids` as the recents list of Identifier(ids.size()) and waits until it is applied.
+void StoreRecents(ServiceClient& client, const std::vector<std::string>& ids) {
+  MessageValue array = MessageValue::MakeArray();
+  for (const std::string& id : ids) array.Append(MessageValue::String(id));
+  client.Send(Request("set", {{"target", MessageValue::String("recents")},
+                              {"array", std::move(array)},
+                              {"identifier", MessageValue::String(Identifier(static_cast<int>(ids.size())))}}));
+}
+
+bool Fence(ServiceClient& client) {
+  return client
+      .Request(Request("read", {{"target", MessageValue::String("favorites")},
+                                {"identifier", MessageValue::String("bench.fence")}}),
+               std::chrono::seconds(30))
+      .has_value();
+}
+
+// Times each iteration of `body` and reports the p50 and p90 as counters.
+template <typename Body>
+void TimeIterations(benchmark::State& state, Body body) {
+  std::vector<double> micros;
+  for (auto _ : state) {
+    const auto start = Clock::now();
+    if (!body()) {
+      state.SkipWithError("the service did not answer");
+      return;
+    }
+    const std::chrono::duration<double> elapsed = Clock::now() - start;
+    state.SetIterationTime(elapsed.count());
+    micros.push_back(elapsed.count() * 1e6);
+  }
+  std::sort(micros.begin(), micros.end());
+  if (micros.empty()) return;
+  state.counters["p50_us"] = micros[micros.size() / 2];
+  state.counters["p90_us"] = micros[micros.size() * 9 / 10];
+}
+
+void BM_AddRoundTrip(benchmark::State& state) {
+  ServiceClient* client = BenchService::Get().client();
+  if (client == nullptr) return state.SkipWithError("no service");
+  const int count = static_cast<int>(state.range(0));
+  const std::vector<std::string> ids = EntityIDs(count);
+  StoreRecents(*client, ids);
+  Fence(*client);
+  // The list rotates: the entry added is always the current last one.
+  int next = count - 1;
+  TimeIterations(state, [&] {
+    client->Send(Request("add", {{"target", MessageValue::String("recents")},
+                                 {"item", MessageValue::String(ids[static_cast<std::size_t>(next)])},
+                                 {"identifier", MessageValue::String(Identifier(count))}}));
+    next = next == 0 ? count - 1 : next - 1;
+    return Fence(*client);
+  });
+}
+BENCHMARK(BM_AddRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+
+void BM_FenceRoundTrip(benchmark::State& state) {
+  ServiceClient* client = BenchService::Get().client();
+  if (client == nullptr) return state.SkipWithError("no service");
+  TimeIterations(state, [&] { return Fence(*client); });
+}
+BENCHMARK(BM_FenceRoundTrip)->UseManualTime()->Unit(benchmark::kMicrosecond);
+
+void BM_ReadRoundTrip(benchmark::State& state) {
+  ServiceClient* client = BenchService::Get().client();
+  if (client == nullptr) return state.SkipWithError("no service");
+  const int count = static_cast<int>(state.range(0));
+  StoreRecents(*client, EntityIDs(count));
+  Fence(*client);
+  const MessageValue read = Request("read", {{"target", MessageValue::String("recents")},
+                                             {"identifier", MessageValue::String(Identifier(count))}});
+  TimeIterations(state, [&] {
+    std::optional<MessageValue> reply = client->Request(read, std::chrono::seconds(30));
+    return reply && reply->Find("array") && reply->Find("array")->is_array();
+  });
+}
+BENCHMARK(BM_ReadRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+
+void BM_FsyncedWrite(benchmark::State& state) {
+  const int count = static_cast<int>(state.range(0));
+  plist::Array list;
+  for (const std::string& id : EntityIDs(count)) list.emplace_back(id);
+  const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(
+      plist::Value(plist::Dictionary{{"version", 1}, {"Recents:" + Identifier(count), std::move(list)}}));
+  const std::filesystem::path target = BenchService::Get().root() / "fsynced-write.plist";
+  const std::string temporary = target.string() + ".tmp";
+  TimeIterations(state, [&] {
+    const int fd = open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0600);
+    if (fd < 0) return false;
+    const bool written = write(fd, bytes.data(), bytes.size()) == static_cast<ssize_t>(bytes.size());
+    const bool synced = fsync(fd) == 0;
+    close(fd);
+    return written && synced && rename(temporary.c_str(), target.c_str()) == 0;
+  });
+  state.counters["bytes"] = static_cast<double>(bytes.size());
+}
+BENCHMARK(BM_FsyncedWrite)->Arg(10)->Arg(1000)->Arg(10000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+
+}  // namespace
+}  // namespace lumeris
+
+BENCHMARK_MAIN();
