@@ -19,14 +19,6 @@ class StoreOperationsTest : public testing::StoreTest {
   ServiceOperations operations_;
 };
 
-TEST_F(StoreOperationsTest, InstallsEveryStoreMember) {
-  EXPECT_TRUE(operations_.CopyRecentsIDArray && operations_.SetRecentsIDArray && operations_.AddRecentID &&
-              operations_.CopyFavoritesIDArray && operations_.SetFavoritesIDArray &&
-              operations_.CopySkinToneHistory && operations_.SetLastSkinToneSelection &&
-              operations_.CopyLastState && operations_.SetLastState);
-  EXPECT_FALSE(operations_.PrepareOpeningLargeVistrel);
-}
-
 TEST_F(StoreOperationsTest, WithoutIdentifierOrApplicationNothingIsReadOrWritten) {
   seedStore({{"Recents:", plist::Array{"r"}},
              {"Favorites:", plist::Array{"f"}},
