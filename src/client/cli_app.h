@@ -1,0 +1,31 @@
+// The `lumeris` command line: builds the CLI11 app with every subcommand and runs one command
+// line through it. main() is RunCli(argc, argv, std::cout, std::cerr); tests pass their own
+// channel (to see the requests a command line builds without a service) and streams.
+//
+//   lumeris [--json] [--timeout SECONDS] <subcommand> ...
+//
+// Thread-safety: one command line at a time per app; RunCli may run on any thread.
+#pragma once
+
+#include <CLI/CLI.hpp>
+
+#include <ostream>
+
+#include "client/cli_channel.h"
+#include "client/cli_session.h"
+
+namespace lumeris::cli {
+
+// Adds the global options and every subcommand to `app`, all talking through `session`, which
+// must outlive `app`.
+void BuildCliApp(CLI::App& app, CliSession& session);
+
+// Parses and runs one command line against `channel`; returns the exit status (help and usage
+// errors included, printed as CLI11 prints them).
+int RunCli(int argc, const char* const* argv, ServiceChannel& channel, std::ostream& out,
+           std::ostream& err);
+
+// The same against the real service (connecting, and starting it, on first use).
+int RunCli(int argc, const char* const* argv, std::ostream& out, std::ostream& err);
+
+}  // namespace lumeris::cli

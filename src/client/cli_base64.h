@@ -1,0 +1,23 @@
+// Base64 (RFC 4648, standard alphabet, "=" padding) for the data values that `lumeris raw` and
+// `--json` output carry inside JSON as {"$data": "<base64>"}.
+//
+// Thread-safety: pure functions. Results are owned by the caller.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace lumeris::cli {
+
+// The padded base64 text of `bytes`.
+std::string EncodeBase64(const std::vector<std::uint8_t>& bytes);
+
+// The bytes of padded base64 text; std::nullopt for a length that is not a multiple of four, a
+// character outside the alphabet, padding anywhere but at the end, or non-zero bits left over
+// in the last group (so every byte string has exactly one accepted spelling).
+std::optional<std::vector<std::uint8_t>> DecodeBase64(std::string_view text);
+
+}  // namespace lumeris::cli

@@ -1,0 +1,54 @@
+// Human-readable and JSON forms of the service's replies, one function per kind of reply. Each
+// human form is whole lines ("...\n"), one result per line; an empty string means there was
+// nothing to print (the caller says so in its own words).
+//
+//   FormatCharacters(["😀", "a"])  ->  "😀\tU+1F600\na\tU+0061\n"
+//   FormatItems([entity IDs])       ->  "👍🏽\tU+1F44D U+1F3FD\tVantorelColorEmoji\n"
+//
+// Thread-safety: pure functions. Results are owned by the caller.
+#pragma once
+
+#include <nlohmann/json.hpp>
+
+#include <array>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "service/message_value.h"
+
+namespace lumeris::cli {
+
+// The sixteen tags of a character information record in their field order.
+inline constexpr std::array<std::string_view, 16> kCharacterInfoTags = {
+    "unam", "jyom", "krpi", "spin", "swbx", "swbh", "sbix", "cbai",
+    "tcan", "tday", "tpin", "tzhu", "rsu1", "rsu2", "rsu3", "rsu4"};
+
+// One line per string element of a search result: the character, a tab, its code points.
+// Elements that are not strings are skipped; a value that is not an array prints nothing.
+std::string FormatCharacters(const MessageValue* result);
+
+// A character information record: a first line with the character and its code points, then
+// "<tag>\t<value>" for the sixteen tags in field order (a missing one shows as empty), then any
+// other keys the record holds. An empty or missing record prints nothing.
+std::string FormatCharacterInfo(std::string_view character, const MessageValue* record);
+
+// One line per entity ID of a recents or favourites list (an array or null): the character, a
+// tab, its code points, and the font and glyph when the ID records them; a string that is not
+// an entity ID prints as it is, marked "(opaque)".
+std::string FormatItems(const MessageValue* list);
+
+// The category entries of a "read_categorydata" result, paired with the names asked for: the
+// name and title, the size of the icon, then the characters (ordinary categories) or one
+// indented line per sub-category (the emoji category).
+std::string FormatCategories(const std::vector<std::string>& names, const MessageValue* result);
+
+// A "read_recents_favorites" reply: recents and favourites as FormatItems() under headings,
+// then the skin-tone history and the state as compact JSON.
+std::string FormatReadAll(const MessageValue& reply);
+
+// The reply as JSON for --json: JsonFromMessageValue(), except that the JSON payloads
+// "skintones" and "state" (data holding JSON text) are embedded as the JSON they hold.
+nlohmann::json ReplyJson(const MessageValue& reply);
+
+}  // namespace lumeris::cli

@@ -1,0 +1,79 @@
+// CliSession: what every `lumeris` subcommand shares while one command line runs: the channel
+// to the service, the output streams and the global options (--json, --timeout). Commands call
+// Ask() for requests that answer and Tell() for those that never do; both report a failure to
+// the error stream once, in one sentence, and the command then ends with a non-zero status.
+//
+// Exit statuses of `lumeris`: 0 success; 1 the service could not be reached or did not answer in
+// time; 2 an argument the command cannot use (bad JSON, an unknown escape); CLI11's own codes
+// for malformed command lines.
+//
+// Thread-safety: one session per command line, used by one thread.
+#pragma once
+
+#include <nlohmann/json.hpp>
+
+#include <chrono>
+#include <optional>
+#include <ostream>
+#include <string>
+#include <string_view>
+
+#include "client/cli_channel.h"
+#include "service/message_value.h"
+
+namespace lumeris::cli {
+
+inline constexpr int kExitNoAnswer = 1;
+inline constexpr int kExitBadArgument = 2;
+
+inline constexpr char kDefaultIdentifier[] = "com.vantorel.Lumeris.DefaultDataStorage";
+inline constexpr char kDefaultApplication[] = "com.vantorel.lumeris-cli";
+
+struct CliSettings {
+  bool json = false;
+  double timeout_seconds = 5.0;
+};
+
+class CliSession {
+ public:
+  CliSession(ServiceChannel& channel, std::ostream& out, std::ostream& err)
+      : channel_(channel), out_(out), err_(err) {}
+
+  CliSettings& settings() { return settings_; }
+  bool json() const { return settings_.json; }
+  std::ostream& out() { return out_; }
+  std::ostream& err() { return err_; }
+
+  // --timeout as a duration (at least 1 ms).
+  std::chrono::milliseconds timeout() const;
+
+  // The reply to `request`, or std::nullopt after printing "lumeris: <what>: <reason>".
+  std::optional<MessageValue> Ask(std::string_view what, const MessageValue& request);
+  // The same with an explicit timeout and, when `quiet`, without printing.
+  std::optional<MessageValue> Ask(std::string_view what, const MessageValue& request,
+                                  std::chrono::milliseconds timeout, bool quiet);
+  // Sends a request that never answers and waits until the service has handled it; false after
+  // printing the reason.
+  bool Tell(std::string_view what, const MessageValue& request);
+
+  // Prints "lumeris: <message>" to the error stream.
+  void Complain(std::string_view message);
+  // Prints `json` on one line to the output stream.
+  void PrintJson(const nlohmann::json& json);
+  // Prints `lines` (whole lines), or `when_empty` and a newline when there are none.
+  void PrintLines(std::string_view lines, std::string_view when_empty);
+
+ private:
+  ServiceChannel& channel_;
+  std::ostream& out_;
+  std::ostream& err_;
+  CliSettings settings_;
+};
+
+// Ends the running subcommand with `status` (CLI11 turns it into the program's exit status).
+[[noreturn]] void ExitWith(int status);
+
+// A request dictionary holding "command".
+MessageValue CommandRequest(std::string_view command);
+
+}  // namespace lumeris::cli

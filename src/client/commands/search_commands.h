@@ -1,0 +1,19 @@
+// The character database subcommands of `lumeris`:
+//   search TEXT [--limit N]    "search_matched_chars"
+//   related CHAR [--limit N]   "search_related_chars"
+//   info CHAR                  "search_character_info"
+//   categories NAME...         "read_categorydata"
+//
+// Thread-safety: the registered callbacks run on the thread that parses the command line.
+#pragma once
+
+#include <CLI/CLI.hpp>
+
+#include "client/cli_session.h"
+
+namespace lumeris::cli {
+
+// Adds the four subcommands to `app`; they talk through `session`, which must outlive `app`.
+void AddSearchCommands(CLI::App& app, CliSession& session);
+
+}  // namespace lumeris::cli
