@@ -133,7 +133,7 @@ TEST_F(ServiceTest, NestingUpToTheLimitIsAccepted) {
   // Envelope and body count as two of the 64 containers.
   RawConnection connection = Connect();
   ASSERT_TRUE(connection.SendBytes(
-      Envelope(std::string("\x82\xa7" "command" "\xa7" "search_" "\xa1" "a", 21) + Nested(62))));
+      Envelope(std::string("\x82\xa7" "command" "\xa7" "search_" "\xa1" "a") + Nested(62))));
   EXPECT_TRUE(connection.ReadReply(1));
 }
 
