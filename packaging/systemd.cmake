@@ -1,7 +1,9 @@
 # systemd user units: the socket starts lumeris-fileservice on the first connection.
 # The service unit names the installed program, so it is configured with the install path.
-set(LUMERIS_SYSTEMD_USER_UNIT_DIR "${CMAKE_INSTALL_PREFIX}/lib/systemd/user"
-    CACHE PATH "Where the systemd user units are installed")
+# Relative to the install prefix, so `cmake --install --prefix` moves the units with the programs;
+# ExecStart names the program under the prefix chosen at configure time.
+set(LUMERIS_SYSTEMD_USER_UNIT_DIR "lib/systemd/user"
+    CACHE STRING "Where the systemd user units are installed, relative to the prefix")
 set(LUMERIS_UNITS_DIR ${CMAKE_CURRENT_BINARY_DIR}/systemd)
 configure_file(${CMAKE_CURRENT_LIST_DIR}/com.vantorel.Lumeris.FileService.service
                ${LUMERIS_UNITS_DIR}/com.vantorel.Lumeris.FileService.service @ONLY)
