@@ -1,11 +1,16 @@
 #include "service/service_operations.h"
 
+#include "service/large_viewer.h"
+#include "store/store_operations.h"
+
 namespace lumeris {
 
 namespace {
 
 ServiceOperations BuildInstalledOperations() {
   ServiceOperations operations;
+  InstallStoreOperations(operations);
+  operations.PrepareOpeningLargeVistrel = PrepareOpeningLargeVistrel;
   return operations;
 }
 
