@@ -34,7 +34,7 @@ std::optional<plist::Value> CopyRecentsIDArray(std::string_view identifier);
 // notification once: the history step posts it when it wrote, otherwise this function does.
 // Returns the history step's result. A first entry that is not a string counts as an entry the
 // history cannot use: the history is left alone.
-bool SetRecentsIDArray(const std::optional<plist::Array>& list, std::string_view identifier);
+bool SetRecentsIDArray(std::optional<plist::Array> list, std::string_view identifier);
 
 // Puts `item` at the front of the list and stores it. When an entry equal to `item` under
 // IsEqualRecentEntityID exists, the first such entry is taken and every entry whose text is
