@@ -12,7 +12,8 @@ lumeris_add_gtest(store_test
 lumeris_add_gtest(store_e2e_test
   SOURCES store/store_e2e_test.cc
   LIBS lumeris_store lumeris_service_fixture lumeris_notifications lumeris_viewer_names
-  LABELS store e2e dbus)
+  LABELS store e2e dbus
+  PRIVATE_BUS)
 
 lumeris_add_gtest(large_viewer_e2e_test
   SOURCES store/large_viewer_e2e_test.cc

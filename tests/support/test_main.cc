@@ -2,6 +2,11 @@
 // at a sandbox inside the build tree, so no test can read or write the real user's
 // preferences, sockets or caches, and point LUMERIS_SYSTEM_ROOT at the bundles the build wrote
 // unless the caller chose another root. Child processes the tests start inherit all of it.
+//
+// Built with LUMERIS_TEST_PRIVATE_BUS, it also starts a D-Bus session bus for this process
+// alone (and the services its tests start), and stops it when the tests end.
+#include <signal.h>
+#include <stdio.h>
 #include <stdlib.h>
 #include <sys/stat.h>
 
@@ -10,6 +15,8 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+
+#include "support/temp_dir.h"
 
 namespace {
 
@@ -33,10 +40,45 @@ void EnterSandbox() {
   setenv("LUMERIS_SYSTEM_ROOT", LUMERIS_TEST_SYSTEM_ROOT, 0);
 }
 
+#ifdef LUMERIS_TEST_PRIVATE_BUS
+// A dbus-daemon serving this test process only; DBUS_SESSION_BUS_ADDRESS points at it while it
+// lives. Without dbus-daemon the variable is left as it was and bus tests skip themselves.
+class PrivateSessionBus {
+ public:
+  PrivateSessionBus() {
+    const std::string command = "dbus-daemon --session --fork --print-address=1 --print-pid=1 --address=unix:path=" +
+                                (dir_.path() / "bus").string() + " 2>/dev/null";
+    FILE* out = popen(command.c_str(), "r");
+    if (out == nullptr) return;
+    char address[512] = {};
+    long pid = 0;
+    if (fgets(address, sizeof address, out) != nullptr && fscanf(out, "%ld", &pid) == 1) {
+      std::string text(address);
+      while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
+      setenv("DBUS_SESSION_BUS_ADDRESS", text.c_str(), 1);
+      pid_ = static_cast<pid_t>(pid);
+    }
+    pclose(out);
+  }
+  ~PrivateSessionBus() {
+    if (pid_ > 0) kill(pid_, SIGTERM);
+  }
+  PrivateSessionBus(const PrivateSessionBus&) = delete;
+  PrivateSessionBus& operator=(const PrivateSessionBus&) = delete;
+
+ private:
+  lumeris::testing::ScopedTempDir dir_;
+  pid_t pid_ = -1;
+};
+#endif
+
 }  // namespace
 
 int main(int argc, char** argv) {
   EnterSandbox();
   testing::InitGoogleMock(&argc, argv);
+#ifdef LUMERIS_TEST_PRIVATE_BUS
+  PrivateSessionBus bus;
+#endif
   return RUN_ALL_TESTS();
 }
