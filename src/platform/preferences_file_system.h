@@ -60,8 +60,8 @@ class PreferencesFileSystem {
   virtual bool CreateDirectories(const std::filesystem::path& dir);
   // Blocks until this process holds an exclusive flock on `lock_path` (created if needed).
   virtual std::optional<FileLock> LockExclusive(const std::filesystem::path& lock_path);
-  // Writes a temporary file beside `path`, fsyncs it, renames it over `path` and fsyncs the
-  // directory. On failure `path` is untouched and the temporary file removed.
+  // Writes a temporary file beside `path`, fsyncs it and renames it over `path`. On failure
+  // `path` is untouched and the temporary file removed.
   virtual bool ReplaceAtomically(const std::filesystem::path& path, std::span<const std::uint8_t> bytes);
   // Renames without replacing an existing `to`; false when `to` exists or the rename fails.
   virtual bool RenameNoReplace(const std::filesystem::path& from, const std::filesystem::path& to);
