@@ -13,8 +13,8 @@ std::string_view Env(const char* name) {
   return value ? std::string_view(value) : std::string_view();
 }
 
-// XDG base directories must be absolute; a relative value is ignored as the specification of
-// those variables asks.
+// XDG base directories must be absolute; the XDG Base Directory rules say a relative value is
+// ignored.
 bool IsAbsolute(std::string_view path) { return !path.empty() && path.front() == '/'; }
 
 std::optional<std::filesystem::path> ConfigRoot(PreferencesUser user) {
