@@ -84,3 +84,7 @@ add_custom_command(
   COMMENT "Building the resource bundles under ${LUMERIS_BUILD_SYSTEM_ROOT}"
   VERBATIM)
 add_custom_target(lumeris_resources ALL DEPENDS ${LUMERIS_RESOURCES_STAMP})
+
+# Installed, the bundles live at the system root the programs use by default.
+install(DIRECTORY ${LUMERIS_BUILD_SYSTEM_ROOT}/System
+        DESTINATION ${CMAKE_INSTALL_DATADIR}/lumeris/root)
