@@ -3,15 +3,12 @@ lumeris_add_gtest(lumeris_text_test
   SOURCES
     ${CMAKE_CURRENT_LIST_DIR}/text/code_string_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/text/emoji_test.cc
-    ${CMAKE_CURRENT_LIST_DIR}/text/replacement_dictionary_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/text/scalar_test.cc
-    ${CMAKE_CURRENT_LIST_DIR}/text/utf8_test.cc
   LIBS lumeris
   LABELS text)
 lumeris_add_gtest(lumeris_entity_test
   SOURCES
     ${CMAKE_CURRENT_LIST_DIR}/entity/entity_id_test.cc
-    ${CMAKE_CURRENT_LIST_DIR}/entity/recent_equality_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/entity/vistrel_item_test.cc
   LIBS lumeris
   LABELS entity)

@@ -1,3 +1,4 @@
+// The emoji tables and functions, and the replacement dictionary keyed by them.
 #include "text/emoji.h"
 
 #include <gtest/gtest.h>
@@ -7,6 +8,7 @@
 #include <set>
 
 #include "text/emoji_tables.h"
+#include "text/replacement_dictionary.h"
 #include "text/unicode_strings.h"
 
 namespace lumeris {
@@ -15,68 +17,38 @@ namespace {
 using testing::Scalars;
 using testing::Units;
 
-// --- The tables -------------------------------------------------------------------------------
-
-TEST(EmojiTables, SkinToneBasesAreDistinctModifierBases) {
-  const std::set<uint32_t> distinct(kSkinToneBaseTable.begin(), kSkinToneBaseTable.end());
-  EXPECT_EQ(distinct.size(), kSkinToneBaseTable.size());
-  for (uint32_t base : kSkinToneBaseTable) {
-    EXPECT_TRUE(u_hasBinaryProperty(static_cast<UChar32>(base), UCHAR_EMOJI_MODIFIER_BASE))
-        << std::hex << base;
-  }
-}
-
-TEST(EmojiTables, VariantTableIsAscendingAndEveryEntryIsAnEmoji) {
+// Both tables are checked against ICU's emoji properties, independently of how they are written.
+TEST(EmojiTables, HoldDistinctEmojiOfTheRightKind) {
+  EXPECT_EQ(std::set(kSkinToneBaseTable.begin(), kSkinToneBaseTable.end()).size(), 64u);
+  for (UChar32 base : kSkinToneBaseTable)
+    EXPECT_TRUE(u_hasBinaryProperty(base, UCHAR_EMOJI_MODIFIER_BASE)) << std::hex << base;
   EXPECT_TRUE(std::is_sorted(kVariantEmojiTable.begin(), kVariantEmojiTable.end()));
-  EXPECT_EQ(std::adjacent_find(kVariantEmojiTable.begin(), kVariantEmojiTable.end()),
-            kVariantEmojiTable.end());
-  for (uint32_t value : kVariantEmojiTable) {
-    EXPECT_TRUE(u_hasBinaryProperty(static_cast<UChar32>(value), UCHAR_EMOJI)) << std::hex << value;
-  }
+  EXPECT_EQ(std::set(kVariantEmojiTable.begin(), kVariantEmojiTable.end()).size(), 134u);
+  for (UChar32 value : kVariantEmojiTable)
+    EXPECT_TRUE(u_hasBinaryProperty(value, UCHAR_EMOJI)) << std::hex << value;
 }
-
-// --- IsEmojiFontName --------------------------------------------------------------------------
 
 TEST(IsEmojiFontName, MatchesTheExactNameOnly) {
   EXPECT_TRUE(IsEmojiFontName(icu::UnicodeString(u"VantorelColorEmoji")));
-  EXPECT_FALSE(IsEmojiFontName(icu::UnicodeString(u"vantorelcoloremoji")));
-  EXPECT_FALSE(IsEmojiFontName(icu::UnicodeString(u"VantorelColorEmoji ")));
-  EXPECT_FALSE(IsEmojiFontName(icu::UnicodeString(u"VantorelColorEmo")));
-  EXPECT_FALSE(IsEmojiFontName(icu::UnicodeString()));
+  for (auto name : {u"vantorelcoloremoji", u"VantorelColorEmoji ", u"VantorelColor", u""})
+    EXPECT_FALSE(IsEmojiFontName(name));
 }
-
-// --- ContainedDiversityUnicode ----------------------------------------------------------------
 
 TEST(ContainedDiversityUnicode, FindsTheBaseOfALoneEmojiWithAtMostOneModifierOrSelector) {
-  const struct {
-    icu::UnicodeString text;
-    uint32_t expected;
-  } cases[] = {
-      {Scalars({0x1F44D, 0x1F3FD}), 0x1F44D},
-      {Scalars({0x1F44D}), 0x1F44D},
-      {Scalars({0x261D, 0xFE0F}), 0x261D},
-      {Scalars({0x1F44D, 0x1F3FD, 0xFE0F}), 0},
-      {Scalars({0x261D, 0xFE0E}), 0},
-      {Scalars({0x1F466, 0x1F467}), 0x1F466},
-      {Scalars({0x1F600}), 0},
-      {Scalars({0x41, 0x1F44D}), 0x1F44D},
-      {Scalars({0xFE0E, 0x1F44D}), 0x1F44D},
-      {Units({0xD83D}), 0},
-      {icu::UnicodeString(), 0},
-  };
-  for (const auto& c : cases) {
+  const struct { icu::UnicodeString text; uint32_t expected; } cases[] = {
+      {Scalars({0x1F44D, 0x1F3FD}), 0x1F44D}, {Scalars({0x1F44D}), 0x1F44D},
+      {Scalars({0x261D, 0xFE0F}), 0x261D},    {Scalars({0x1F44D, 0x1F3FD, 0xFE0F}), 0},
+      {Scalars({0x261D, 0xFE0E}), 0},         {Scalars({0x1F466, 0x1F467}), 0x1F466},
+      {Scalars({0x1F600}), 0},                {Scalars({0x41, 0x1F44D}), 0x1F44D},
+      {Scalars({0xFE0E, 0x1F44D}), 0x1F44D},  {Units({0xD83D}), 0}, {icu::UnicodeString(), 0}};
+  for (const auto& c : cases)
     EXPECT_EQ(ContainedDiversityUnicode(c.text), c.expected) << ::testing::PrintToString(c.text);
-  }
-}
-
-TEST(ContainedDiversityUnicode, EveryBaseIsFoundAloneAndWithEachModifier) {
   for (uint32_t base : kSkinToneBaseTable) {
     EXPECT_EQ(ContainedDiversityUnicode(Scalars({base})), base) << std::hex << base;
     EXPECT_EQ(ContainedDiversityUnicode(Scalars({base, 0xFE0F})), base) << std::hex << base;
     EXPECT_EQ(ContainedDiversityUnicode(Scalars({base, 0xFE0E})), 0u) << std::hex << base;
-    for (uint32_t tone = kFirstSkinToneModifier; tone <= kLastSkinToneModifier; ++tone) {
+    for (uint32_t tone = kFirstSkinToneModifier; tone <= kLastSkinToneModifier; ++tone)
       EXPECT_EQ(ContainedDiversityUnicode(Scalars({base, tone})), base) << std::hex << base;
-    }
   }
 }
 
@@ -85,39 +57,26 @@ TEST(ContainedDiversityUnicode, EveryBaseIsFoundAloneAndWithEachModifier) {
 TEST(ContainedDiversityUnicode, ReportsTheBaseListedFirstInTheTable) {
   for (size_t i = 0; i < kSkinToneBaseTable.size(); ++i) {
     for (size_t j = i + 1; j < kSkinToneBaseTable.size(); ++j) {
-      const uint32_t earlier = kSkinToneBaseTable[i];
-      const uint32_t later = kSkinToneBaseTable[j];
-      ASSERT_EQ(ContainedDiversityUnicode(Scalars({later, earlier})), earlier)
-          << std::hex << later << " " << earlier;
-      ASSERT_EQ(ContainedDiversityUnicode(Scalars({earlier, later})), earlier)
-          << std::hex << earlier << " " << later;
+      const uint32_t earlier = kSkinToneBaseTable[i], later = kSkinToneBaseTable[j];
+      ASSERT_EQ(ContainedDiversityUnicode(Scalars({later, earlier})), earlier) << std::hex << later;
+      ASSERT_EQ(ContainedDiversityUnicode(Scalars({earlier, later})), earlier) << std::hex << later;
     }
   }
 }
 
-// --- IsValidEmojiScalarForVariant -------------------------------------------------------------
-
 TEST(IsValidEmojiScalarForVariant, AcceptsExactlyTheTableEntries) {
-  EXPECT_TRUE(IsValidEmojiScalarForVariant(0x23));
-  EXPECT_TRUE(IsValidEmojiScalarForVariant(0x1F237));
-  EXPECT_TRUE(IsValidEmojiScalarForVariant(0x2764));
-  EXPECT_FALSE(IsValidEmojiScalarForVariant(0x24));
-  EXPECT_FALSE(IsValidEmojiScalarForVariant(0x1F600));
-  EXPECT_FALSE(IsValidEmojiScalarForVariant(0));
-  int accepted = 0;
-  for (uint32_t value = 0; value <= 0x10FFFF; ++value) accepted += IsValidEmojiScalarForVariant(value);
-  EXPECT_EQ(accepted, 134);
+  const std::set<uint32_t> table(kVariantEmojiTable.begin(), kVariantEmojiTable.end());
+  for (uint32_t value : {0x23, 0x1F237, 0x2764}) EXPECT_TRUE(table.contains(value));
+  for (uint32_t value : {0x24, 0x1F600, 0}) EXPECT_FALSE(table.contains(value));
+  for (uint32_t value = 0; value <= 0x10FFFF; ++value)
+    ASSERT_EQ(IsValidEmojiScalarForVariant(value), table.contains(value)) << std::hex << value;
 }
 
-// --- CompareEmojiStrings ----------------------------------------------------------------------
-
 TEST(CompareEmojiStrings, IgnoresOnlyWhatTheFlagsAllow) {
+  const icu::UnicodeString none;
   const struct {
-    icu::UnicodeString a;
-    icu::UnicodeString b;
-    bool selectors_significant;
-    bool skin_tones_significant;
-    bool expected;
+    icu::UnicodeString a, b;
+    bool selectors_significant, skin_tones_significant, expected;
   } cases[] = {
       {Scalars({0x1F44D, 0x1F3FB}), Scalars({0x1F44D}), true, false, true},
       {Scalars({0x1F44D, 0x1F3FB}), Scalars({0x1F44D}), true, true, false},
@@ -129,34 +88,89 @@ TEST(CompareEmojiStrings, IgnoresOnlyWhatTheFlagsAllow) {
       {Scalars({0x2764, 0xFE00}), Scalars({0x2764}), false, false, false},
       {Scalars({0x1F468, 0x200D, 0x1F466}), Scalars({0x1F468, 0x1F466}), false, false, false},
       {Scalars({0x1F44D, 0x1F3FB, 0xFE0F}), Scalars({0x1F44D}), false, false, true},
-      {Scalars({0x1F3FB}), icu::UnicodeString(), true, false, true},
-      {icu::UnicodeString(), icu::UnicodeString(), false, false, true},
-      {icu::UnicodeString(), icu::UnicodeString(), true, true, true},
+      {Scalars({0x1F3FB}), none, true, false, true},
+      {none, none, false, false, true},
+      {none, none, true, true, true},
       {Scalars({0x41}), Scalars({0x42}), false, false, false},
       {Units({0xD83D}), Units({0xD83D}), false, false, true},
-      {Units({0xD83D}), Units({0xD83C}), false, false, false},
-  };
+      {Units({0xD83D}), Units({0xD83C}), false, false, false}};
   for (const auto& c : cases) {
-    EXPECT_EQ(CompareEmojiStrings(c.a, c.b, c.selectors_significant, c.skin_tones_significant),
-              c.expected)
-        << ::testing::PrintToString(c.a) << " vs " << ::testing::PrintToString(c.b)
-        << " selectors " << c.selectors_significant << " skin tones " << c.skin_tones_significant;
-    EXPECT_EQ(CompareEmojiStrings(c.b, c.a, c.selectors_significant, c.skin_tones_significant),
-              c.expected)
-        << "symmetry";
+    const bool selectors = c.selectors_significant, tones = c.skin_tones_significant;
+    SCOPED_TRACE(::testing::PrintToString(c.a) + " vs " + ::testing::PrintToString(c.b) +
+                 (selectors ? " selectors" : "") + (tones ? " skin tones" : ""));
+    EXPECT_EQ(CompareEmojiStrings(c.a, c.b, selectors, tones), c.expected);
+    EXPECT_EQ(CompareEmojiStrings(c.b, c.a, selectors, tones), c.expected) << "swapped";
   }
 }
 
 TEST(CompareEmojiStrings, HandlesStringsLongerThanTheStackScratch) {
-  icu::UnicodeString a;
-  icu::UnicodeString b;
-  for (int i = 0; i < 200; ++i) {
-    a.append(static_cast<UChar32>(0x1F44D)).append(static_cast<UChar32>(0x1F3FD));
-    b.append(static_cast<UChar32>(0x1F44D));
-  }
+  icu::UnicodeString a, b;
+  for (int i = 0; i < 200; ++i) a.append(Scalars({0x1F44D, 0x1F3FD}));
+  for (int i = 0; i < 200; ++i) b.append(Scalars({0x1F44D}));
   EXPECT_TRUE(CompareEmojiStrings(a, b, true, false));
-  b.append(u'x');
-  EXPECT_FALSE(CompareEmojiStrings(a, b, true, false));
+  EXPECT_FALSE(CompareEmojiStrings(a, b.append(u'x'), true, false));
+}
+
+TEST(ReplacementDictionaryNormalizedKeyString, NormalizesLoneSkinToneCapableEmoji) {
+  const struct { icu::UnicodeString text, key; bool had_skin_tone; } cases[] = {
+      {Scalars({0x1F44D, 0x1F3FD}), Scalars({0x1F44D}), true},
+      {Scalars({0x261D, 0x1F3FD}), Scalars({0x261D, 0xFE0F}), true},
+      {Scalars({0x261D}), Scalars({0x261D, 0xFE0F}), false},
+      {Scalars({0x261D, 0xFE0F}), Scalars({0x261D, 0xFE0F}), false},
+      {Scalars({0x1F44D}), Scalars({0x1F44D}), false},
+      {Scalars({0x1F44D, 0xFE0F}), Scalars({0x1F44D, 0xFE0F}), false},
+      {Scalars({0x270C, 0x1F3FF}), Scalars({0x270C, 0xFE0F}), true},
+      // Only a modifier at the end is removed; here the base comes last.
+      {Scalars({0x1F3FD, 0x1F44D}), Scalars({0x1F3FD, 0x1F44D}), false}};
+  for (const auto& c : cases) {
+    bool had_skin_tone = !c.had_skin_tone;
+    const auto key = ReplacementDictionaryNormalizedKeyString(c.text, &had_skin_tone);
+    EXPECT_EQ(key, c.key) << ::testing::PrintToString(c.text);
+    EXPECT_EQ(had_skin_tone, c.had_skin_tone) << ::testing::PrintToString(c.text);
+    EXPECT_EQ(ReplacementDictionaryNormalizedKeyString(c.text), key) << "without the out-flag";
+  }
+  for (uint32_t base : kSkinToneBaseTable) {
+    const icu::UnicodeString expected = IsValidEmojiScalarForVariant(base)
+                                            ? Scalars({base, kEmojiPresentationSelector})
+                                            : Scalars({base});
+    for (uint32_t tone = kFirstSkinToneModifier; tone <= kLastSkinToneModifier; ++tone) {
+      bool flag = false;
+      EXPECT_EQ(ReplacementDictionaryNormalizedKeyString(Scalars({base, tone}), &flag), expected)
+          << std::hex << base << " " << tone;
+      EXPECT_TRUE(flag);
+    }
+  }
+}
+
+TEST(ReplacementDictionaryNormalizedKeyStringErrors, GivesNoKeyAndLeavesTheFlagAlone) {
+  for (const auto& text : {Scalars({0x261D, 0xFE0E}), Scalars({0x1F600}), Scalars({0x41}),
+                           icu::UnicodeString(), Scalars({0x1F44D, 0x1F3FD, 0xFE0F})}) {
+    SCOPED_TRACE(::testing::PrintToString(text));
+    bool flag = true;
+    EXPECT_EQ(ReplacementDictionaryNormalizedKeyString(text, &flag), std::nullopt);
+    EXPECT_TRUE(flag) << "flag written";
+  }
+}
+
+// One history through a sequence of choices: the last choice per base is kept, an unkeyable
+// choice fails and changes nothing, an empty choice clears everything.
+TEST(UpdateReplacementDictionary, RemembersTheLastChoicePerBase) {
+  const icu::UnicodeString thumbs = Scalars({0x1F44D});
+  const icu::UnicodeString thumbs_medium = Scalars({0x1F44D, 0x1F3FD});
+  const icu::UnicodeString finger_dark = Scalars({0x261D, 0x1F3FF});
+  ReplacementDictionary history;
+  EXPECT_TRUE(UpdateReplacementDictionary(thumbs_medium, history));
+  EXPECT_EQ(history, (ReplacementDictionary{{thumbs, thumbs_medium}}));
+  EXPECT_TRUE(UpdateReplacementDictionary(thumbs, history));
+  EXPECT_EQ(history, (ReplacementDictionary{{thumbs, thumbs}}));
+  EXPECT_TRUE(UpdateReplacementDictionary(finger_dark, history));
+  const ReplacementDictionary both{{thumbs, thumbs}, {Scalars({0x261D, 0xFE0F}), finger_dark}};
+  EXPECT_EQ(history, both);
+  EXPECT_FALSE(UpdateReplacementDictionary(Scalars({0x41}), history));
+  EXPECT_FALSE(UpdateReplacementDictionary(Scalars({0x261D, 0xFE0E}), history));
+  EXPECT_EQ(history, both);
+  EXPECT_TRUE(UpdateReplacementDictionary(icu::UnicodeString(), history));
+  EXPECT_TRUE(history.empty());
 }
 
 }  // namespace

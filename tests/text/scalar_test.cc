@@ -1,3 +1,4 @@
+// Scalar values, surrogates and UTF-8: exact tables, plus sweeps checked against ICU's encoders.
 #include "text/scalar.h"
 
 #include <gtest/gtest.h>
@@ -7,6 +8,7 @@
 #include <vector>
 
 #include "text/unicode_strings.h"
+#include "text/utf8.h"
 
 namespace lumeris {
 namespace {
@@ -14,25 +16,18 @@ namespace {
 using testing::Scalars;
 using testing::Units;
 
-// --- ScalerValueToUnicode ---------------------------------------------------------------------
+constexpr char16_t kUntouched = 0xAAAA;
 
-struct ToUnicodeCase {
-  uint32_t value;
-  int count;
-  char16_t first;
-  char16_t second;
-};
-
-TEST(ScalerValueToUnicode, WritesUnitsAndCountsAsListed) {
-  const ToUnicodeCase cases[] = {
-      {0x41, 1, 0x0041, 0},           {0x1F44D, 2, 0xD83D, 0xDC4D},
-      {0x10FFFF, 2, 0xDBFF, 0xDFFF},  {0x110000, 0, 0xDC00, 0xDC00},
-      {0xD800, 1, 0xD800, 0},         {0xFFFF, 1, 0xFFFF, 0},
-      {0x10000, 2, 0xD800, 0xDC00},   {0x4010000, 2, 0xD800, 0xDC00},
-      {0x410FFFF, 2, 0xDBFF, 0xDFFF}, {0xFFFFFFFF, 0, 0xD7BF, 0xDFFF},
-  };
-  for (const ToUnicodeCase& c : cases) {
-    char16_t out[2] = {0, 0};
+// Above U+10FFFF both units are still written; the count is 2 only where the 32-bit high half
+// passes the surrogate mask test (0x4010000 wraps), else 0. Zero writes nothing.
+TEST(ScalerValueToUnicode, WritesUnitsAndCountsIncludingTheWrapCases) {
+  const struct { uint32_t value; int count; char16_t first, second; } cases[] = {
+      {0, 0, kUntouched, kUntouched}, {0x41, 1, 0x41, 0},            {0xD800, 1, 0xD800, 0},
+      {0xFFFF, 1, 0xFFFF, 0},         {0x10000, 2, 0xD800, 0xDC00},  {0x1F44D, 2, 0xD83D, 0xDC4D},
+      {0x10FFFF, 2, 0xDBFF, 0xDFFF},  {0x110000, 0, 0xDC00, 0xDC00}, {0x4010000, 2, 0xD800, 0xDC00},
+      {0x410FFFF, 2, 0xDBFF, 0xDFFF}, {0xFFFFFFFF, 0, 0xD7BF, 0xDFFF}};
+  for (const auto& c : cases) {
+    char16_t out[2] = {kUntouched, kUntouched};
     EXPECT_EQ(ScalerValueToUnicode(c.value, out), c.count) << std::hex << c.value;
     EXPECT_EQ(out[0], c.first) << std::hex << c.value;
     if (c.count != 1) {
@@ -41,28 +36,18 @@ TEST(ScalerValueToUnicode, WritesUnitsAndCountsAsListed) {
   }
 }
 
-TEST(ScalerValueToUnicode, ZeroWritesNothing) {
-  char16_t out[2] = {0x1234, 0x5678};
-  EXPECT_EQ(ScalerValueToUnicode(0, out), 0);
-  EXPECT_EQ(out[0], 0x1234);
-  EXPECT_EQ(out[1], 0x5678);
-}
-
-// Above U+10FFFF the count follows the 32-bit high half: 2 exactly when the excess over 0x10000,
-// taken modulo 0x4000000, is below 0x100000.
+// The count is 2 exactly when the excess over 0x10000, modulo 0x4000000, is below 0x100000.
 TEST(ScalerValueToUnicode, WrapsAboveTheUnicodeRangeOnlyWhereTheMaskTestPasses) {
+  char16_t out[2];
   for (uint64_t value = 0x110000; value <= 0xFFFFFFFF; value += 0x3FF1) {
     const auto v = static_cast<uint32_t>(value);
-    const bool wraps = ((v - 0x10000) % 0x4000000) < 0x100000;
-    char16_t out[2];
-    EXPECT_EQ(ScalerValueToUnicode(v, out), wraps ? 2 : 0) << std::hex << v;
+    EXPECT_EQ(ScalerValueToUnicode(v, out), ((v - 0x10000) % 0x4000000) < 0x100000 ? 2 : 0)
+        << std::hex << v;
   }
-  for (uint32_t block = 1; block < 64; ++block) {
-    const uint32_t first_wrapped = 0x10000 + block * 0x4000000;
-    char16_t out[2];
-    EXPECT_EQ(ScalerValueToUnicode(first_wrapped, out), 2) << std::hex << first_wrapped;
-    EXPECT_EQ(ScalerValueToUnicode(first_wrapped + 0xFFFFF, out), 2) << std::hex << first_wrapped;
-    EXPECT_EQ(ScalerValueToUnicode(first_wrapped + 0x100000, out), 0) << std::hex << first_wrapped;
+  for (uint32_t first = 0x10000 + 0x4000000; first > 0x10000; first += 0x4000000) {
+    EXPECT_EQ(ScalerValueToUnicode(first, out), 2) << std::hex << first;
+    EXPECT_EQ(ScalerValueToUnicode(first + 0xFFFFF, out), 2) << std::hex << first;
+    EXPECT_EQ(ScalerValueToUnicode(first + 0x100000, out), 0) << std::hex << first;
   }
 }
 
@@ -80,76 +65,46 @@ TEST(ScalerValueToUnicode, EveryScalarRoundTripsThroughUnicodeToScalerValue) {
   }
 }
 
-// --- UnicodeToScalerValue ---------------------------------------------------------------------
-
-struct ToScalarCase {
-  int64_t count;
-  char16_t units[3];
-  uint32_t expected;
-};
-
 TEST(UnicodeToScalerValue, DecodesPairsAndPassesSingleUnitsThrough) {
-  const ToScalarCase cases[] = {
-      {2, {0xD83D, 0xDC4D}, 0x1F44D},  {2, {0xD800, 0xDC00}, 0x10000},
-      {2, {0xDBFF, 0xDFFF}, 0x10FFFF}, {2, {0xD83D, 0x0041}, 0},
-      {2, {0xDC4D, 0xD83D}, 0},        {2, {0x0041, 0x0042}, 0},
-      {1, {0xDC4D}, 0xDC4D},           {1, {0xD83D, 0xDC4D}, 0xD83D},
-      {1, {0x0041}, 0x41},             {3, {0xD83D, 0xDC4D, 0x41}, 0},
-      {0, {0x41}, 0},                  {-1, {0x41}, 0},
-  };
-  for (const ToScalarCase& c : cases) {
+  const struct { int64_t count; char16_t units[3]; uint32_t expected; } cases[] = {
+      {2, {0xD83D, 0xDC4D}, 0x1F44D}, {2, {0xD800, 0xDC00}, 0x10000}, {2, {0xD83D, 0x41}, 0},
+      {2, {0xDBFF, 0xDFFF}, 0x10FFFF}, {2, {0xDC4D, 0xD83D}, 0}, {2, {0x41, 0x42}, 0},
+      {1, {0xDC4D}, 0xDC4D}, {1, {0xD83D, 0xDC4D}, 0xD83D}, {1, {0x41}, 0x41},
+      {3, {0xD83D, 0xDC4D, 0x41}, 0}, {0, {0x41}, 0}, {-1, {0x41}, 0}};
+  for (const auto& c : cases) {
     EXPECT_EQ(UnicodeToScalerValue(c.count, c.units), c.expected)
         << "count " << c.count << " first unit " << std::hex << static_cast<unsigned>(c.units[0]);
   }
 }
 
-// --- IsSurrogatePair --------------------------------------------------------------------------
-
 TEST(IsSurrogatePair, NeedsHighThenLow) {
-  const char16_t pair[] = {0xD83D, 0xDC4D};
-  const char16_t reversed[] = {0xDC4D, 0xD83D};
-  const char16_t two_high[] = {0xD83D, 0xDBFF};
-  const char16_t letters[] = {0x41, 0xDC00};
-  EXPECT_TRUE(IsSurrogatePair(pair));
-  EXPECT_FALSE(IsSurrogatePair(reversed));
-  EXPECT_FALSE(IsSurrogatePair(two_high));
-  EXPECT_FALSE(IsSurrogatePair(letters));
+  const char16_t pairs[][2] = {{0xD83D, 0xDC4D}, {0xDBFF, 0xDC00}};
+  const char16_t others[][2] = {{0xDC4D, 0xD83D}, {0xD83D, 0xDBFF}, {0x41, 0xDC00}, {0xD83D, 0x41}};
+  for (const auto& units : pairs) EXPECT_TRUE(IsSurrogatePair(units)) << std::hex << +units[0];
+  for (const auto& units : others) EXPECT_FALSE(IsSurrogatePair(units)) << std::hex << +units[0];
 }
 
-// --- StringToScalerValues ---------------------------------------------------------------------
-
-struct ToScalarsCase {
-  icu::UnicodeString text;
-  std::vector<uint32_t> expected;
-};
-
 TEST(StringToScalerValues, SplitsPairsAndKeepsLoneSurrogates) {
-  const ToScalarsCase cases[] = {
+  const struct { icu::UnicodeString text; std::vector<uint32_t> expected; } cases[] = {
       {Scalars({0x61, 0x1F44D, 0x62}), {0x61, 0x1F44D, 0x62}},
-      {Units({0x61, 0xD83D}), {0x61, 0xD83D}},
-      {Units({0xDC4D, 0xD83D}), {0xDC4D, 0xD83D}},
+      {Units({0x61, 0xD83D}), {0x61, 0xD83D}}, {Units({0xDC4D, 0xD83D}), {0xDC4D, 0xD83D}},
       {Units({0xD83D, 0xD83D, 0xDC4D}), {0xD83D, 0x1F44D}},
-      {Units({0xDC4D}), {0xDC4D}},
-      {Scalars({0x1F44D, 0x1F3FD}), {0x1F44D, 0x1F3FD}},
-      {icu::UnicodeString(), {}},
-  };
-  for (const ToScalarsCase& c : cases) {
+      {Scalars({0x1F44D, 0x1F3FD}), {0x1F44D, 0x1F3FD}}, {icu::UnicodeString(), {}}};
+  for (const auto& c : cases) {
     std::vector<uint32_t> out(static_cast<size_t>(c.text.length()) + 1, 0xAAAAAAAA);
-    const int64_t count = StringToScalerValues(c.text, out.data());
-    out.resize(static_cast<size_t>(count));
-    EXPECT_EQ(out, c.expected);
+    out.resize(static_cast<size_t>(StringToScalerValues(c.text, out.data())));
+    EXPECT_EQ(out, c.expected) << ::testing::PrintToString(c.text);
   }
 }
 
-// Random strings over letters, surrogates and selectors decode exactly as ICU's U16_NEXT, which
-// also passes unpaired surrogates through as their own value.
+// Random mixes of letters, surrogates and selectors decode exactly as ICU's U16_NEXT, which also
+// passes unpaired surrogates through as their own value.
 TEST(StringToScalerValues, AgreesWithIcuIterationOnRandomSurrogateMixes) {
   const char16_t alphabet[] = {0x41, 0xD83D, 0xDC4D, 0xDBFF, 0xDC00, 0xFE0F, 0xD800, 0xDFFF};
   std::mt19937 random(20240521);
   for (int round = 0; round < 5000; ++round) {
     icu::UnicodeString text;
-    const int length = static_cast<int>(random() % 9);
-    for (int i = 0; i < length; ++i) text.append(alphabet[random() % std::size(alphabet)]);
+    for (int i = static_cast<int>(random() % 9); i > 0; --i) text.append(alphabet[random() % 8]);
     std::vector<uint32_t> expected;
     for (int32_t i = 0; i < text.length();) {
       UChar32 c;
@@ -162,31 +117,42 @@ TEST(StringToScalerValues, AgreesWithIcuIterationOnRandomSurrogateMixes) {
   }
 }
 
-// --- StringContainsCharacter and StringContainsVariationSelector -------------------------------
-
 TEST(StringContainsCharacter, ComparesCodeUnitsNotScalars) {
   const icu::UnicodeString thumbs = Scalars({0x41, 0x1F44D});
-  EXPECT_TRUE(StringContainsCharacter(thumbs, u'A'));
-  EXPECT_TRUE(StringContainsCharacter(thumbs, 0xD83D));
-  EXPECT_TRUE(StringContainsCharacter(thumbs, 0xDC4D));
-  EXPECT_FALSE(StringContainsCharacter(thumbs, u'B'));
-  EXPECT_FALSE(StringContainsCharacter(thumbs, 0xF44D));
+  for (char16_t unit : {0x41, 0xD83D, 0xDC4D}) EXPECT_TRUE(StringContainsCharacter(thumbs, unit));
+  for (char16_t unit : {0x42, 0xF44D}) EXPECT_FALSE(StringContainsCharacter(thumbs, unit));
   EXPECT_FALSE(StringContainsCharacter(icu::UnicodeString(), 0));
 }
 
 TEST(StringContainsVariationSelector, CountsOnlyTheTwoPresentationSelectors) {
-  const struct {
-    icu::UnicodeString text;
-    bool expected;
-  } cases[] = {
-      {Scalars({0x2764, 0xFE0F}), true}, {Scalars({0x263A, 0xFE0E}), true},
-      {Scalars({0xFE0F}), true},         {Scalars({0x263A, 0xFE00}), false},
-      {Scalars({0xFE0D}), false},        {Scalars({0x845B, 0xE0100}), false},
-      {Scalars({0xFE1F}), false},        {icu::UnicodeString(), false},
-  };
-  for (const auto& c : cases) {
-    EXPECT_EQ(StringContainsVariationSelector(c.text), c.expected)
-        << ::testing::PrintToString(c.text);
+  for (const auto& text : {Scalars({0x2764, 0xFE0F}), Scalars({0x263A, 0xFE0E}), Scalars({0xFE0F})})
+    EXPECT_TRUE(StringContainsVariationSelector(text)) << ::testing::PrintToString(text);
+  for (const auto& text : {Scalars({0x263A, 0xFE00}), Scalars({0xFE0D}), Scalars({0x845B, 0xE0100}),
+                           Scalars({0xFE1F}), icu::UnicodeString()}) {
+    EXPECT_FALSE(StringContainsVariationSelector(text)) << ::testing::PrintToString(text);
+  }
+}
+
+TEST(Utf8, DecodesAndEncodesWellFormedText) {
+  EXPECT_EQ(DecodeUtf8(""), icu::UnicodeString());
+  EXPECT_EQ(DecodeUtf8(std::string_view("a\0b", 3)), Scalars({0x61, 0, 0x62}));
+  const icu::UnicodeString text = Scalars({0x41, 0xE9, 0x2708, 0x1F44D, 0x10FFFF});
+  const std::string utf8 = "A\xC3\xA9\xE2\x9C\x88\xF0\x9F\x91\x8D\xF4\x8F\xBF\xBF";
+  EXPECT_EQ(DecodeUtf8(utf8), text);
+  EXPECT_EQ(EncodeUtf8(text), utf8);
+  EXPECT_EQ(EncodeUtf8Lenient(text), utf8);
+}
+
+TEST(Utf8Errors, RejectsIllFormedBytesAndUnpairedSurrogatesUnlessLenient) {
+  for (const char* bytes : {"\x80", "\xC3", "\xE2\x9C", "\xC0\x80", "\xE0\x80\x80", "\xED\xA0\x80",
+                            "\xF4\x90\x80\x80", "\xF5\x80\x80\x80", "\xFF", "ok\xC3("}) {
+    EXPECT_FALSE(DecodeUtf8(bytes).has_value()) << bytes;
+    EXPECT_GE(DecodeUtf8Lenient(bytes).indexOf(static_cast<char16_t>(0xFFFD)), 0) << bytes;
+  }
+  for (const icu::UnicodeString& text :
+       {Units({0xD83D}), Units({0x41, 0xDC4D}), Units({0xDC4D, 0xD83D})}) {
+    EXPECT_FALSE(EncodeUtf8(text).has_value()) << ::testing::PrintToString(text);
+    EXPECT_NE(EncodeUtf8Lenient(text).find("\xEF\xBF\xBD"), std::string::npos);
   }
 }
 

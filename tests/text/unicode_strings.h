@@ -1,12 +1,10 @@
-// Test helpers for building UTF-16 strings from scalar values or raw code units, and for printing
-// icu::UnicodeString in failure messages as its code units.
+// Test helpers: UTF-16 strings from scalar values or raw code units, and icu::UnicodeString shown
+// in failure messages as its code units.
 #pragma once
 
 #include <unicode/unistr.h>
 
-#include <cstdint>
 #include <initializer_list>
-#include <iomanip>
 #include <ostream>
 
 namespace lumeris::testing {
@@ -20,9 +18,7 @@ inline icu::UnicodeString Scalars(std::initializer_list<uint32_t> values) {
 
 // The string of exactly these code units (lone surrogates included).
 inline icu::UnicodeString Units(std::initializer_list<char16_t> units) {
-  icu::UnicodeString text;
-  for (char16_t unit : units) text.append(unit);
-  return text;
+  return icu::UnicodeString(units.begin(), static_cast<int32_t>(units.size()));
 }
 
 }  // namespace lumeris::testing
@@ -31,7 +27,7 @@ U_NAMESPACE_BEGIN
 // Shows strings as their code units, e.g. [D83D DC4D], so surrogates and selectors are visible.
 inline void PrintTo(const UnicodeString& text, std::ostream* out) {
   *out << '[' << std::hex << std::uppercase;
-  for (int32_t i = 0; i < text.length(); ++i) *out << (i ? " " : "") << static_cast<unsigned>(text.charAt(i));
+  for (int32_t i = 0; i < text.length(); ++i) *out << (i ? " " : "") << +text.charAt(i);
   *out << std::dec << ']';
 }
 U_NAMESPACE_END
