@@ -11,7 +11,6 @@ lumeris_add_gtest(lumeris_service_unit_test
   SOURCES
     ${CMAKE_CURRENT_LIST_DIR}/service/message_value_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/service/wire_test.cc
-    ${CMAKE_CURRENT_LIST_DIR}/service/string_array_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/service/dispatch_test.cc
   LIBS lumeris_service
   LABELS service)

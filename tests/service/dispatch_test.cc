@@ -4,15 +4,17 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace lumeris {
 namespace {
 
+using Calls = std::vector<std::string>;
+
 MessageValue Request(std::string command,
                      std::vector<std::pair<std::string, MessageValue>> more = {}) {
-  MessageValue request = MessageValue::MakeDictionary();
-  request.Set("command", MessageValue::String(std::move(command)));
+  MessageValue request = MessageValue::MakeDictionary({{"command", MessageValue::String(command)}});
   for (auto& [key, value] : more) request.Set(key, std::move(value));
   return request;
 }
@@ -23,8 +25,9 @@ MessageValue Strings(std::vector<std::string> strings) {
   return array;
 }
 
+std::string Show(const std::string& text) { return text; }
+std::string Show(std::uint64_t number) { return std::to_string(number); }
 std::string Show(const OptionalString& text) { return text ? "'" + *text + "'" : "absent"; }
-
 std::string Show(const StringList& list) {
   if (!list) return "absent";
   std::string out = "[";
@@ -32,68 +35,39 @@ std::string Show(const StringList& list) {
   return out + "]";
 }
 
-// Every operation installed; each call is written to `calls` as "Name(arguments)".
+// Every operation installed; each call is written to `calls_` as "Name(arguments)" and returns
+// the member the test may change.
 class DispatchTest : public ::testing::Test {
  protected:
-  DispatchTest() {
-    ops_.CopyRecentsIDArray = [this](const OptionalString& id) {
-      Record("CopyRecentsIDArray(" + Show(id) + ")");
-      return recents_;
-    };
-    ops_.SetRecentsIDArray = [this](const StringList& list, const OptionalString& id) {
-      Record("SetRecentsIDArray(" + Show(list) + "," + Show(id) + ")");
-    };
-    ops_.AddRecentID = [this](const std::string& item, const OptionalString& id) {
-      Record("AddRecentID(" + item + "," + Show(id) + ")");
-    };
-    ops_.CopyFavoritesIDArray = [this](const OptionalString& id) {
-      Record("CopyFavoritesIDArray(" + Show(id) + ")");
-      return favorites_;
-    };
-    ops_.SetFavoritesIDArray = [this](const StringList& list, const OptionalString& id) {
-      Record("SetFavoritesIDArray(" + Show(list) + "," + Show(id) + ")");
-    };
-    ops_.CopySkinToneHistory = [this](const OptionalString& id) {
-      Record("CopySkinToneHistory(" + Show(id) + ")");
-      return skin_tones_;
-    };
-    ops_.SetLastSkinToneSelection = [this](const std::string& item, const OptionalString& id) {
-      Record("SetLastSkinToneSelection(" + item + "," + Show(id) + ")");
-    };
-    ops_.CopyLastState = [this](const OptionalString& application) {
-      Record("CopyLastState(" + Show(application) + ")");
-      return state_;
-    };
-    ops_.SetLastState = [this](const OptionalString& state, const OptionalString& application) {
-      Record("SetLastState(" + Show(state) + "," + Show(application) + ")");
-    };
-    ops_.CreateXPCCategoryDataArray = [this](const StringList& names) {
-      Record("CreateXPCCategoryDataArray(" + Show(names) + ")");
-      return MessageValue::MakeArray({MessageValue::String("categories")});
-    };
-    ops_.UpdateCountryInfoAndCheckSignificantChange = [this] {
-      Record("UpdateCountryInfoAndCheckSignificantChange()");
-      return true;
-    };
-    ops_.createXPCArrayForSearchString = [this](const std::string& text, std::uint64_t limit) {
-      Record("createXPCArrayForSearchString(" + text + "," + std::to_string(limit) + ")");
-      return MessageValue::MakeArray({MessageValue::String("matched")});
-    };
-    ops_.createXPCArrayForRelatedCharacters = [this](const std::string& text, std::uint64_t limit) {
-      Record("createXPCArrayForRelatedCharacters(" + text + "," + std::to_string(limit) + ")");
-      return MessageValue::MakeArray({MessageValue::String("related")});
-    };
-    ops_.createXPCDictionaryForCharacterInfo = [this](const std::string& text) {
-      Record("createXPCDictionaryForCharacterInfo(" + text + ")");
-      return MessageValue::MakeDictionary({{"unam", MessageValue::String("info")}});
-    };
-    ops_.PrepareOpeningLargeVistrel = [this](const OptionalString& path) {
-      Record("PrepareOpeningLargeVistrel(" + Show(path) + ")");
-      return true;
+  template <typename Result = bool>
+  auto Op(std::string name, const Result* result = nullptr) {
+    return [this, name, result](const auto&... args) {
+      std::string call = name + "(";
+      [[maybe_unused]] const char* separator = "";
+      ((call += std::exchange(separator, ",") + Show(args)), ...);
+      calls_.push_back(call + ")");
+      return result ? *result : Result{};
     };
   }
 
-  void Record(std::string call) { calls_.push_back(std::move(call)); }
+  DispatchTest() {
+    ops_.CopyRecentsIDArray = Op("CopyRecentsIDArray", &recents_);
+    ops_.SetRecentsIDArray = Op("SetRecentsIDArray");
+    ops_.AddRecentID = Op("AddRecentID");
+    ops_.CopyFavoritesIDArray = Op("CopyFavoritesIDArray", &favorites_);
+    ops_.SetFavoritesIDArray = Op("SetFavoritesIDArray");
+    ops_.CopySkinToneHistory = Op("CopySkinToneHistory", &skin_tones_);
+    ops_.SetLastSkinToneSelection = Op("SetLastSkinToneSelection");
+    ops_.CopyLastState = Op("CopyLastState", &state_);
+    ops_.SetLastState = Op("SetLastState");
+    ops_.CreateXPCCategoryDataArray = Op("CreateXPCCategoryDataArray", &categories_);
+    ops_.UpdateCountryInfoAndCheckSignificantChange =
+        Op("UpdateCountryInfoAndCheckSignificantChange", &yes_);
+    ops_.createXPCArrayForSearchString = Op("createXPCArrayForSearchString", &matched_);
+    ops_.createXPCArrayForRelatedCharacters = Op("createXPCArrayForRelatedCharacters", &related_);
+    ops_.createXPCDictionaryForCharacterInfo = Op("createXPCDictionaryForCharacterInfo", &info_);
+    ops_.PrepareOpeningLargeVistrel = Op("PrepareOpeningLargeVistrel", &yes_);
+  }
 
   std::optional<MessageValue> Dispatch(const MessageValue& request) {
     calls_.clear();
@@ -101,113 +75,92 @@ class DispatchTest : public ::testing::Test {
   }
 
   ServiceOperations ops_;
-  std::vector<std::string> calls_;
+  Calls calls_;
   StringList recents_ = std::vector<std::string>{"r1", "r2"};
   StringList favorites_ = std::vector<std::string>{"f1"};
   OptionalString skin_tones_ = R"({"a":"b"})";
   OptionalString state_ = "{}";
+  bool yes_ = true;
+  MessageValue categories_ = Strings({"categories"});
+  MessageValue matched_ = Strings({"matched"});
+  MessageValue related_ = Strings({"related"});
+  MessageValue info_ = MessageValue::MakeDictionary({{"unam", MessageValue::String("info")}});
 };
 
-using Calls = std::vector<std::string>;
+// --- Matching and replies ------------------------------------------------------------------
 
-// --- Matching ------------------------------------------------------------------------------
-
-TEST_F(DispatchTest, CommandsMatchByPrefixInTableOrder) {
+TEST_F(DispatchTest, CommandsMatchByPrefixInTableOrderAndOnlyReadingCommandsReply) {
   const MessageValue array = Strings({"x"});
   struct Case {
     const char* command;
     const char* first_call;  // "" when nothing may be called
+    bool replies;
   };
   const Case cases[] = {
-      {"search_matched_chars", "createXPCArrayForSearchString(s,0)"},
-      {"search_matched_charsXYZ", "createXPCArrayForSearchString(s,0)"},
-      {"search_related_chars", "createXPCArrayForRelatedCharacters(s,0)"},
-      {"search_character_info", "createXPCDictionaryForCharacterInfo(s)"},
-      {"search_character_infos", "createXPCDictionaryForCharacterInfo(s)"},
-      {"read_categorydata", "CreateXPCCategoryDataArray([x])"},
-      {"read_categorydataX", "CreateXPCCategoryDataArray([x])"},
-      {"read_recents_favorites", "CopyRecentsIDArray(absent)"},
-      {"read_recents_favoritesX", "CopyRecentsIDArray(absent)"},
-      {"read_recents", "CopyRecentsIDArray(absent)"},  // "read" with a recents target
-      {"save_state", "SetLastState(absent,absent)"},
-      {"save_stateful", "SetLastState(absent,absent)"},
-      {"set_skintone", "SetLastSkinToneSelection(,absent)"},
-      {"set_skintones", "SetRecentsIDArray([x],absent)"},
-      {"set_skintonX", "SetRecentsIDArray([x],absent)"},
-      {"readme", "CopyRecentsIDArray(absent)"},
-      {"read", "CopyRecentsIDArray(absent)"},
-      {"settle", "SetRecentsIDArray([x],absent)"},
-      {"set", "SetRecentsIDArray([x],absent)"},
-      {"adder", "AddRecentID(,absent)"},
-      {"add", "AddRecentID(,absent)"},
-      {"open_large_viewer", "PrepareOpeningLargeVistrel(absent)"},
-      {"open_large_viewerX", "PrepareOpeningLargeVistrel(absent)"},
-      {"open_large", ""},
-      {"rea", ""},
-      {"se", ""},
-      {"Read", ""},
-      {"", ""},
+      {"search_matched_chars", "createXPCArrayForSearchString(s,0)", true},
+      {"search_matched_charsXYZ", "createXPCArrayForSearchString(s,0)", true},
+      {"search_related_chars", "createXPCArrayForRelatedCharacters(s,0)", true},
+      {"search_character_info", "createXPCDictionaryForCharacterInfo(s)", true},
+      {"search_character_infos", "createXPCDictionaryForCharacterInfo(s)", true},
+      {"search_other", "", true},
+      {"read_categorydata", "CreateXPCCategoryDataArray([x])", true},
+      {"read_categorydataX", "CreateXPCCategoryDataArray([x])", true},
+      {"read_recents_favorites", "CopyRecentsIDArray(absent)", true},
+      {"read_recents_favoritesX", "CopyRecentsIDArray(absent)", true},
+      {"read_recents", "CopyRecentsIDArray(absent)", true},  // "read" with a recents target
+      {"save_state", "SetLastState(absent,absent)", false},
+      {"save_stateful", "SetLastState(absent,absent)", false},
+      {"set_skintone", "SetLastSkinToneSelection(,absent)", false},
+      {"set_skintones", "SetRecentsIDArray([x],absent)", false},
+      {"set_skintonX", "SetRecentsIDArray([x],absent)", false},
+      {"readme", "CopyRecentsIDArray(absent)", true},
+      {"read", "CopyRecentsIDArray(absent)", true},
+      {"settle", "SetRecentsIDArray([x],absent)", false},
+      {"set", "SetRecentsIDArray([x],absent)", false},
+      {"adder", "AddRecentID(,absent)", false},
+      {"add", "AddRecentID(,absent)", false},
+      {"open_large_viewer", "PrepareOpeningLargeVistrel(absent)", true},
+      {"open_large_viewerX", "PrepareOpeningLargeVistrel(absent)", true},
+      {"open_large", "", false},
+      {"rea", "", false},
+      {"se", "", false},
+      {"Read", "", false},
+      {"", "", false},
   };
   for (const Case& c : cases) {
-    Dispatch(Request(c.command, {{"target", MessageValue::String("recents")},
-                                 {"string", MessageValue::String("s")},
-                                 {"categories", array},
-                                 {"array", array}}));
+    SCOPED_TRACE(c.command);
+    std::optional<MessageValue> reply =
+        Dispatch(Request(c.command, {{"target", MessageValue::String("recents")},
+                                     {"string", MessageValue::String("s")},
+                                     {"categories", array},
+                                     {"array", array}}));
+    EXPECT_EQ(reply.has_value(), c.replies);
     if (*c.first_call == '\0') {
-      EXPECT_TRUE(calls_.empty()) << c.command;
+      EXPECT_TRUE(calls_.empty());
     } else {
-      ASSERT_FALSE(calls_.empty()) << c.command;
+      ASSERT_FALSE(calls_.empty());
       // A text search refreshes the regional state first.
       const std::string& first =
           calls_[0] == "UpdateCountryInfoAndCheckSignificantChange()" ? calls_.at(1) : calls_[0];
-      EXPECT_EQ(first, c.first_call) << c.command;
+      EXPECT_EQ(first, c.first_call);
     }
   }
 }
 
-TEST_F(DispatchTest, RepliesOnlyForReadingCommands) {
-  struct Case {
-    const char* command;
-    bool replies;
-  };
-  const Case cases[] = {
-      {"search_matched_chars", true}, {"search_related_chars", true},
-      {"search_character_info", true}, {"search_other", true},
-      {"read_categorydata", true},    {"read_recents_favorites", true},
-      {"read", true},                 {"open_large_viewer", true},
-      {"save_state", false},          {"set_skintone", false},
-      {"set", false},                 {"add", false},
-      {"unknown", false},
-  };
-  for (const Case& c : cases) {
-    EXPECT_EQ(Dispatch(Request(c.command)).has_value(), c.replies) << c.command;
-  }
-  MessageValue no_command = MessageValue::MakeDictionary();
-  EXPECT_FALSE(Dispatch(no_command));
-  EXPECT_TRUE(calls_.empty());
-  EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary({{"command", MessageValue::Uint64(3)}})));
-}
-
 TEST_F(DispatchTest, TargetBeginningWithRecentsSelectsRecentsAnyOtherFavorites) {
-  struct Case {
-    std::optional<std::string> target;
-    bool recents;
-  };
-  const Case cases[] = {{"recents", true},      {"recentsX", true}, {"favorites", false},
-                        {"", false},            {"Recents", false}, {"recent", false},
-                        {std::nullopt, false}};
-  for (const Case& c : cases) {
-    MessageValue read = Request("read");
-    if (c.target) read.Set("target", MessageValue::String(*c.target));
-    std::optional<MessageValue> reply = Dispatch(read);
-    ASSERT_TRUE(reply);
-    EXPECT_EQ(calls_, Calls{c.recents ? "CopyRecentsIDArray(absent)" : "CopyFavoritesIDArray(absent)"})
-        << Show(c.target);
-    MessageValue set = read;
-    set.Set("command", MessageValue::String("set"));
-    Dispatch(set);
-    EXPECT_EQ(calls_, Calls{c.recents ? "SetRecentsIDArray(absent,absent)"
-                                      : "SetFavoritesIDArray(absent,absent)"});
+  const std::pair<std::optional<std::string>, std::string> cases[] = {
+      {"recents", "Recents"}, {"recentsX", "Recents"}, {"favorites", "Favorites"},
+      {"", "Favorites"},      {"Recents", "Favorites"}, {"recent", "Favorites"},
+      {std::nullopt, "Favorites"}};
+  for (const auto& [target, list] : cases) {
+    SCOPED_TRACE(Show(target));
+    MessageValue request = Request("read");
+    if (target) request.Set("target", MessageValue::String(*target));
+    EXPECT_TRUE(Dispatch(request));
+    EXPECT_EQ(calls_, Calls{"Copy" + list + "IDArray(absent)"});
+    request.Set("command", MessageValue::String("set"));
+    Dispatch(request);
+    EXPECT_EQ(calls_, Calls{"Set" + list + "IDArray(absent,absent)"});
   }
 }
 
@@ -232,21 +185,119 @@ TEST_F(DispatchTest, SearchesPutResultAndEchoTransactionId) {
   EXPECT_EQ(calls_, (Calls{"UpdateCountryInfoAndCheckSignificantChange()",
                            "createXPCArrayForSearchString(cat,12)"}));
   EXPECT_EQ(*reply, MessageValue::MakeDictionary(
-                        {{"result", MessageValue::MakeArray({MessageValue::String("matched")})},
-                         {"transactionID", MessageValue::Uint64(99)}}));
+                        {{"result", matched_}, {"transactionID", MessageValue::Uint64(99)}}));
 
   reply = Dispatch(Request("search_related_chars", {{"limit", MessageValue::String("12")}}));
   ASSERT_TRUE(reply);
   EXPECT_EQ(calls_, Calls{"createXPCArrayForRelatedCharacters(,0)"});
   EXPECT_EQ(reply->GetUint64("transactionID"), 0u);
-}
 
-TEST_F(DispatchTest, UnknownSearchSubCommandAnswersOnlyTheTransactionId) {
-  std::optional<MessageValue> reply =
-      Dispatch(Request("search_", {{"transactionID", MessageValue::Uint64(5)}}));
+  reply = Dispatch(Request("search_", {{"transactionID", MessageValue::Uint64(5)}}));
   ASSERT_TRUE(reply);
   EXPECT_TRUE(calls_.empty());
   EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"transactionID", MessageValue::Uint64(5)}}));
+}
+
+// --- Store, categories, viewer -------------------------------------------------------------
+
+TEST_F(DispatchTest, ReadRecentsFavoritesCollectsFourValuesInOrder) {
+  std::optional<MessageValue> reply =
+      Dispatch(Request("read_recents_favorites", {{"identifier", MessageValue::String("id")},
+                                                  {"application", MessageValue::String("app")}}));
+  ASSERT_TRUE(reply);
+  EXPECT_EQ(calls_, (Calls{"CopyRecentsIDArray('id')", "CopyFavoritesIDArray('id')",
+                           "CopySkinToneHistory('id')", "CopyLastState('app')"}));
+  EXPECT_EQ(*reply, MessageValue::MakeDictionary(
+                        {{"recents", Strings({"r1", "r2"})},
+                         {"favorites", Strings({"f1"})},
+                         {"skintones", MessageValue::DataFromBytes(R"({"a":"b"})")},
+                         {"state", MessageValue::DataFromBytes("{}")}}));
+
+  // Empty and absent lists travel as null; a missing history is left out.
+  recents_ = std::vector<std::string>{};
+  favorites_ = std::nullopt;
+  skin_tones_ = std::nullopt;
+  reply = Dispatch(Request("read_recents_favorites"));
+  ASSERT_TRUE(reply);
+  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"recents", MessageValue::Null()},
+                                                  {"favorites", MessageValue::Null()},
+                                                  {"state", MessageValue::DataFromBytes("{}")}}));
+  reply = Dispatch(Request("read", {{"target", MessageValue::String("recents")}}));
+  ASSERT_TRUE(reply);
+  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"array", MessageValue::Null()}}));
+}
+
+TEST_F(DispatchTest, ListsArePassedByTheConversionRules) {
+  struct Case {
+    const char* name;
+    std::optional<MessageValue> array;
+    const char* list;
+  };
+  const Case cases[] = {
+      {"missing", std::nullopt, "absent"},
+      {"not an array", MessageValue::String("a"), "absent"},
+      {"empty array", MessageValue::MakeArray(), "absent"},
+      {"only integers", MessageValue::MakeArray({MessageValue::Uint64(1)}), "[]"},
+      {"mixed", MessageValue::MakeArray({MessageValue::String("a"), MessageValue::Uint64(1),
+                                         MessageValue::Null(), MessageValue::String("b")}),
+       "[a,b]"},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.name);
+    MessageValue set = Request("set", {{"target", MessageValue::String("favorites")}});
+    MessageValue categories = Request("read_categorydata");
+    if (c.array) {
+      set.Set("array", *c.array);
+      categories.Set("categories", *c.array);
+    }
+    EXPECT_FALSE(Dispatch(set));
+    EXPECT_EQ(calls_, Calls{"SetFavoritesIDArray(" + std::string(c.list) + ",absent)"});
+    std::optional<MessageValue> reply = Dispatch(categories);
+    ASSERT_TRUE(reply);
+    EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(" + std::string(c.list) + ")"});
+    EXPECT_EQ(*reply->Find("result"), categories_);
+  }
+}
+
+TEST_F(DispatchTest, SaveStatePassesDataOnlyWhenItParsesAsJson) {
+  struct Case {
+    std::optional<MessageValue> data;
+    const char* passed;
+  };
+  const Case cases[] = {
+      {MessageValue::DataFromBytes(R"({"k":1})"), R"('{"k":1}')"},
+      {MessageValue::DataFromBytes("[1]"), "'[1]'"},
+      {MessageValue::DataFromBytes("{broken"), "absent"},
+      {MessageValue::DataFromBytes("5"), "absent"},
+      {MessageValue::String(R"({"k":1})"), "absent"},
+      {std::nullopt, "absent"},
+  };
+  for (const Case& c : cases) {
+    MessageValue request = Request("save_state", {{"application", MessageValue::String("app")}});
+    if (c.data) request.Set("data", *c.data);
+    EXPECT_FALSE(Dispatch(request));
+    EXPECT_EQ(calls_, Calls{"SetLastState(" + std::string(c.passed) + ",'app')"});
+  }
+}
+
+TEST_F(DispatchTest, OpenLargeViewerAnswersEmptyAfterWritingThePath) {
+  std::optional<MessageValue> reply =
+      Dispatch(Request("open_large_viewer", {{"path", MessageValue::String("/p")}}));
+  ASSERT_TRUE(reply);
+  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
+  EXPECT_EQ(*reply, MessageValue::MakeDictionary());
+}
+
+// --- Bad requests and missing operations ---------------------------------------------------
+
+TEST_F(DispatchTest, WrongTypedValuesReadAsAbsentAndBytesArePassedAsSent) {
+  EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary()));
+  EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary({{"command", MessageValue::Uint64(3)}})));
+  EXPECT_TRUE(calls_.empty());
+  const std::string invalid_utf8 = "\xff\xfe";
+  Dispatch(Request("set_skintone", {{"item", MessageValue::String(invalid_utf8)},
+                                    {"identifier", MessageValue::Uint64(1)}}));
+  EXPECT_EQ(calls_, Calls{"SetLastSkinToneSelection(" + invalid_utf8 + ",absent)"});
 }
 
 TEST_F(DispatchTest, CommandWhoseOperationIsMissingBehavesAsUnknown) {
@@ -261,104 +312,6 @@ TEST_F(DispatchTest, CommandWhoseOperationIsMissingBehavesAsUnknown) {
   ops_.UpdateCountryInfoAndCheckSignificantChange = nullptr;
   EXPECT_TRUE(Dispatch(Request("search_matched_chars")));
   EXPECT_EQ(calls_, Calls{"createXPCArrayForSearchString(,0)"});
-}
-
-// --- Store commands ------------------------------------------------------------------------
-
-TEST_F(DispatchTest, ReadRecentsFavoritesCollectsFourValuesInOrder) {
-  std::optional<MessageValue> reply =
-      Dispatch(Request("read_recents_favorites", {{"identifier", MessageValue::String("id")},
-                                                  {"application", MessageValue::String("app")}}));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(calls_, (Calls{"CopyRecentsIDArray('id')", "CopyFavoritesIDArray('id')",
-                           "CopySkinToneHistory('id')", "CopyLastState('app')"}));
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary(
-                        {{"recents", Strings({"r1", "r2"})},
-                         {"favorites", Strings({"f1"})},
-                         {"skintones", MessageValue::DataFromBytes(R"({"a":"b"})")},
-                         {"state", MessageValue::DataFromBytes("{}")}}));
-}
-
-TEST_F(DispatchTest, EmptyAndAbsentListsTravelAsNullAndMissingHistoryIsLeftOut) {
-  recents_ = std::vector<std::string>{};
-  favorites_ = std::nullopt;
-  skin_tones_ = std::nullopt;
-  std::optional<MessageValue> reply = Dispatch(Request("read_recents_favorites"));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"recents", MessageValue::Null()},
-                                                  {"favorites", MessageValue::Null()},
-                                                  {"state", MessageValue::DataFromBytes("{}")}}));
-  reply = Dispatch(Request("read", {{"target", MessageValue::String("recents")}}));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"array", MessageValue::Null()}}));
-}
-
-TEST_F(DispatchTest, SetPassesAbsentOrEmptyListByTheConversionRules) {
-  struct Case {
-    const char* name;
-    std::optional<MessageValue> array;
-    const char* call;
-  };
-  const Case cases[] = {
-      {"missing", std::nullopt, "SetFavoritesIDArray(absent,absent)"},
-      {"not an array", MessageValue::String("a"), "SetFavoritesIDArray(absent,absent)"},
-      {"empty array", MessageValue::MakeArray(), "SetFavoritesIDArray(absent,absent)"},
-      {"only integers", MessageValue::MakeArray({MessageValue::Uint64(1)}),
-       "SetFavoritesIDArray([],absent)"},
-      {"mixed", MessageValue::MakeArray({MessageValue::String("a"), MessageValue::Uint64(1),
-                                         MessageValue::Null(), MessageValue::String("b")}),
-       "SetFavoritesIDArray([a,b],absent)"},
-  };
-  for (const Case& c : cases) {
-    MessageValue request = Request("set", {{"target", MessageValue::String("favorites")}});
-    if (c.array) request.Set("array", *c.array);
-    EXPECT_FALSE(Dispatch(request)) << c.name;
-    EXPECT_EQ(calls_, Calls{c.call}) << c.name;
-  }
-}
-
-TEST_F(DispatchTest, SaveStatePassesDataOnlyWhenItParsesAsJson) {
-  struct Case {
-    std::optional<MessageValue> data;
-    const char* call;
-  };
-  const Case cases[] = {
-      {MessageValue::DataFromBytes(R"({"k":1})"), R"(SetLastState('{"k":1}','app'))"},
-      {MessageValue::DataFromBytes("[1]"), "SetLastState('[1]','app')"},
-      {MessageValue::DataFromBytes("{broken"), "SetLastState(absent,'app')"},
-      {MessageValue::DataFromBytes("5"), "SetLastState(absent,'app')"},
-      {MessageValue::String(R"({"k":1})"), "SetLastState(absent,'app')"},
-      {std::nullopt, "SetLastState(absent,'app')"},
-  };
-  for (const Case& c : cases) {
-    MessageValue request = Request("save_state", {{"application", MessageValue::String("app")}});
-    if (c.data) request.Set("data", *c.data);
-    EXPECT_FALSE(Dispatch(request));
-    EXPECT_EQ(calls_, Calls{c.call});
-  }
-}
-
-TEST_F(DispatchTest, CategoryNamesGoThroughTheListConversion) {
-  std::optional<MessageValue> reply = Dispatch(
-      Request("read_categorydata", {{"categories", MessageValue::MakeArray()}}));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(absent)"});
-  EXPECT_EQ(*reply->Find("result"), MessageValue::MakeArray({MessageValue::String("categories")}));
-}
-
-TEST_F(DispatchTest, OpenLargeViewerAnswersEmptyAfterWritingThePath) {
-  std::optional<MessageValue> reply =
-      Dispatch(Request("open_large_viewer", {{"path", MessageValue::String("/p")}}));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary());
-}
-
-TEST_F(DispatchTest, WrongTypedScopesReadAsAbsentAndBytesArePassedAsSent) {
-  const std::string invalid_utf8 = "\xff\xfe";
-  Dispatch(Request("set_skintone", {{"item", MessageValue::String(invalid_utf8)},
-                                    {"identifier", MessageValue::Uint64(1)}}));
-  EXPECT_EQ(calls_, Calls{"SetLastSkinToneSelection(" + invalid_utf8 + ",absent)"});
 }
 
 }  // namespace

@@ -1,12 +1,19 @@
-// MessageValue accessors: wrong-typed values read as absent, writes only apply to their kind.
+// MessageValue accessors (wrong-typed values read as absent, writes apply only to their kind) and
+// the list conversions (absent versus empty lists, non-string elements).
 #include "service/message_value.h"
 
 #include <gtest/gtest.h>
 
+#include <tuple>
+
+#include "service/string_array.h"
+
 namespace lumeris {
 namespace {
 
-TEST(MessageValue, DictionaryGettersReadWrongTypesAsAbsent) {
+using Strings = std::vector<std::string>;
+
+TEST(MessageValue, GettersReadWrongTypesAndNonDictionariesAsAbsent) {
   MessageValue dictionary = MessageValue::MakeDictionary({
       {"s", MessageValue::String("x")},
       {"u", MessageValue::Uint64(4)},
@@ -21,8 +28,6 @@ TEST(MessageValue, DictionaryGettersReadWrongTypesAsAbsent) {
   EXPECT_EQ(dictionary.GetUint64("s"), 0u);
   EXPECT_EQ(dictionary.GetData("s"), nullptr);
   EXPECT_EQ(*dictionary.GetData("d"), MessageValue::Bytes{'b'});
-
-  // Every getter on a value that is not a dictionary reads as absent.
   for (const MessageValue& other : {MessageValue::Null(), MessageValue::String("s"),
                                     MessageValue::MakeArray({MessageValue::String("s")})}) {
     EXPECT_EQ(other.Find("s"), nullptr);
@@ -31,34 +36,55 @@ TEST(MessageValue, DictionaryGettersReadWrongTypesAsAbsent) {
   }
 }
 
-TEST(MessageValue, SetReplacesAndAppliesOnlyToDictionaries) {
+TEST(MessageValue, SetReplacesAndWritesApplyOnlyToTheirKind) {
   MessageValue dictionary = MessageValue::MakeDictionary();
   dictionary.Set("k", MessageValue::Uint64(1));
   dictionary.Set("k", MessageValue::String("two"));
+  dictionary.Append(MessageValue::Null());
   EXPECT_EQ(dictionary, MessageValue::MakeDictionary({{"k", MessageValue::String("two")}}));
-
   MessageValue array = MessageValue::MakeArray();
   array.Set("k", MessageValue::Uint64(1));
   array.Append(MessageValue::Bool(true));
   EXPECT_EQ(array, MessageValue::MakeArray({MessageValue::Bool(true)}));
-  dictionary.Append(MessageValue::Null());
-  EXPECT_EQ(dictionary.AsDictionary()->size(), 1u);
 }
 
-TEST(MessageValue, EqualityDistinguishesKindsWithEqualNumbers) {
+TEST(MessageValue, EqualityDistinguishesKindsWithEqualContent) {
   EXPECT_NE(MessageValue::Uint64(1), MessageValue::Int64(1));
   EXPECT_NE(MessageValue::String("a"), MessageValue::DataFromBytes("a"));
   EXPECT_NE(MessageValue::Null(), MessageValue::MakeArray());
   EXPECT_EQ(MessageValue(), MessageValue::Null());
 }
 
-TEST(MessageValue, DescribeEscapesBytesAndShowsKinds) {
-  MessageValue value = MessageValue::MakeDictionary({
-      {"a", MessageValue::MakeArray({MessageValue::Int64(-2), MessageValue::Null()})},
-      {"b", MessageValue::String("q\"\n\xff")},
-      {"c", MessageValue::DataFromBytes("\x01\xab")},
-  });
-  EXPECT_EQ(value.Describe(), R"({"a":[-2,null],"b":"q\"\x0a\xff","c":<01ab>})");
+TEST(StringArrayConversions, EmptyOrAbsentListIsNullAndNonEmptyListsRoundTrip) {
+  EXPECT_EQ(CreateXPCArrayFromStringArray(std::nullopt), MessageValue::Null());
+  EXPECT_EQ(CreateXPCArrayFromStringArray(Strings{}), MessageValue::Null());
+  const Strings list{"b", "", "com.vantorel.lmk:{\"char\":\"x\"}", "\xff"};
+  MessageValue wire = CreateXPCArrayFromStringArray(list);
+  EXPECT_EQ(wire, MessageValue::MakeArray({MessageValue::String(list[0]),
+                                           MessageValue::String(list[1]),
+                                           MessageValue::String(list[2]),
+                                           MessageValue::String(list[3])}));
+  EXPECT_EQ(StringArrayFromXPCArray(&wire), list);
+}
+
+TEST(StringArrayConversions, AbsentForNonArraysAndEmptyArraysEmptyForNoStrings) {
+  const MessageValue a = MessageValue::String("a");
+  const MessageValue b = MessageValue::String("b");
+  const std::tuple<const char*, std::optional<MessageValue>, StringList> cases[] = {
+      {"missing", std::nullopt, std::nullopt},
+      {"null", MessageValue::Null(), std::nullopt},
+      {"string", a, std::nullopt},
+      {"dictionary", MessageValue::MakeDictionary({{"a", a}}), std::nullopt},
+      {"empty array", MessageValue::MakeArray(), std::nullopt},
+      {"only integers", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::Int64(-1)}),
+       Strings{}},
+      {"strings kept in order",
+       MessageValue::MakeArray({b, MessageValue::Null(), a, MessageValue::MakeArray({a})}),
+       Strings{"b", "a"}},
+  };
+  for (const auto& [name, value, expected] : cases) {
+    EXPECT_EQ(StringArrayFromXPCArray(value ? &*value : nullptr), expected) << name;
+  }
 }
 
 }  // namespace

@@ -36,33 +36,30 @@ class InProcessService {
 };
 
 // Character info that blocks on "slow" until released, and records the order of calls.
-class GatedOperations {
- public:
+struct GatedOperations {
   GatedOperations() {
     operations.createXPCDictionaryForCharacterInfo = [this](const std::string& text) {
       Record("start " + text);
-      if (text == "slow") gate_.wait();
+      if (text == "slow") gate.wait();
       Record("end " + text);
       return MessageValue::MakeDictionary({{"for", MessageValue::String(text)}});
     };
   }
-  void Release() { release_.set_value(); }
-  std::vector<std::string> log() {
-    std::lock_guard<std::mutex> hold(mutex_);
-    return log_;
+  void Record(std::string entry) {
+    std::lock_guard<std::mutex> hold(mutex);
+    log.push_back(std::move(entry));
+  }
+  // Where `entry` stands in the log; read only after the calls have ended.
+  std::ptrdiff_t Position(const std::string& entry) {
+    std::lock_guard<std::mutex> hold(mutex);
+    return std::find(log.begin(), log.end(), entry) - log.begin();
   }
 
   ServiceOperations operations;
-
- private:
-  void Record(std::string entry) {
-    std::lock_guard<std::mutex> hold(mutex_);
-    log_.push_back(std::move(entry));
-  }
-  std::promise<void> release_;
-  std::shared_future<void> gate_ = release_.get_future().share();
-  std::mutex mutex_;
-  std::vector<std::string> log_;
+  std::promise<void> release;
+  std::shared_future<void> gate = release.get_future().share();
+  std::mutex mutex;
+  std::vector<std::string> log;
 };
 
 MessageValue Info(const char* text) {
@@ -83,19 +80,15 @@ TEST(ServiceRuntime, SlowRequestDelaysItsOwnConnectionButNotAnother) {
   EXPECT_EQ(*reply->Find("result")->GetString("for"), "fast");
   EXPECT_FALSE(slow.ReadFrame(50ms)) << "nothing may come back before the slow request ends";
 
-  gated.Release();
+  gated.release.set_value();
   std::optional<MessageValue> first = slow.ReadReply(blocked, 5s);
   std::optional<MessageValue> second = slow.ReadReply(queued, 5s);
   ASSERT_TRUE(first && second);
   EXPECT_EQ(*first->Find("result")->GetString("for"), "slow");
   EXPECT_EQ(*second->Find("result")->GetString("for"), "after");
   // One at a time on a connection: "after" starts only when "slow" has ended.
-  std::vector<std::string> log = gated.log();
-  auto position = [&](const std::string& entry) {
-    return std::find(log.begin(), log.end(), entry) - log.begin();
-  };
-  EXPECT_LT(position("end slow"), position("start after"));
-  EXPECT_LT(position("end fast"), position("end slow"));
+  EXPECT_LT(gated.Position("end slow"), gated.Position("start after"));
+  EXPECT_LT(gated.Position("end fast"), gated.Position("end slow"));
 }
 
 TEST(ServiceRuntime, HandlerIsReleasedWhenThePeerCloses) {
@@ -142,31 +135,22 @@ TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
   const std::filesystem::path fresh = dir.path() / "fresh";
   std::string why;
   EXPECT_TRUE(EnsurePrivateDirectory(fresh, &why)) << why;
-  struct stat info {};
-  ASSERT_EQ(stat(fresh.c_str(), &info), 0);
-  EXPECT_EQ(info.st_mode & 07777, 0700u);
+  EXPECT_EQ(std::filesystem::status(fresh).permissions(), std::filesystem::perms::owner_all);
 
-  const std::filesystem::path open_to_others = dir.path() / "open";
-  std::filesystem::create_directory(open_to_others);
-  chmod(open_to_others.c_str(), 0755);
-  EXPECT_FALSE(EnsurePrivateDirectory(open_to_others, &why));
-  EXPECT_NE(why.find("0700"), std::string::npos) << why;
-
-  const std::filesystem::path link = dir.path() / "link";
-  std::filesystem::create_directory_symlink(fresh, link);
-  EXPECT_FALSE(EnsurePrivateDirectory(link));
-
-  const std::filesystem::path file = dir.path() / "file";
-  std::ofstream(file) << "x";
-  EXPECT_FALSE(EnsurePrivateDirectory(file));
-
-  if (geteuid() == 0) {
-    const std::filesystem::path foreign = dir.path() / "foreign";
-    std::filesystem::create_directory(foreign);
-    chmod(foreign.c_str(), 0700);
-    ASSERT_EQ(chown(foreign.c_str(), 65534, 65534), 0);
-    EXPECT_FALSE(EnsurePrivateDirectory(foreign, &why));
-    EXPECT_NE(why.find("another user"), std::string::npos) << why;
+  std::filesystem::create_directory(dir.path() / "open");
+  chmod((dir.path() / "open").c_str(), 0755);
+  std::filesystem::create_directory_symlink(fresh, dir.path() / "link");
+  std::ofstream(dir.path() / "file") << "x";
+  std::filesystem::create_directory(dir.path() / "foreign");
+  chmod((dir.path() / "foreign").c_str(), 0700);
+  std::vector<std::pair<std::string, std::string>> refused = {
+      {"open", "0700"}, {"link", ""}, {"file", ""}};
+  if (chown((dir.path() / "foreign").c_str(), 65534, 65534) == 0) {
+    refused.emplace_back("foreign", "another user");
+  }
+  for (const auto& [name, reason] : refused) {
+    EXPECT_FALSE(EnsurePrivateDirectory(dir.path() / name, &why)) << name;
+    EXPECT_NE(why.find(reason), std::string::npos) << name << ": " << why;
   }
 }
 

@@ -32,12 +32,6 @@ MessageValue SampleBody() {
   });
 }
 
-std::vector<Frame> DecodeAll(FrameDecoder& decoder) {
-  std::vector<Frame> frames;
-  while (std::optional<Frame> frame = decoder.Next()) frames.push_back(std::move(*frame));
-  return frames;
-}
-
 TEST(Wire, FramesRoundTripWhateverTheChunking) {
   const Frame sent[] = {{FrameKind::kNoReply, 0, SampleBody()},
                         {FrameKind::kWantsReply, UINT64_MAX, MessageValue::MakeDictionary()},
@@ -49,7 +43,7 @@ TEST(Wire, FramesRoundTripWhateverTheChunking) {
     std::vector<Frame> received;
     for (std::size_t offset = 0; offset < stream.size(); offset += chunk) {
       decoder.Feed(std::string_view(stream).substr(offset, chunk));
-      for (Frame& frame : DecodeAll(decoder)) received.push_back(std::move(frame));
+      while (std::optional<Frame> frame = decoder.Next()) received.push_back(std::move(*frame));
     }
     ASSERT_FALSE(decoder.error()) << chunk;
     EXPECT_FALSE(decoder.Finish()) << chunk;
@@ -95,17 +89,10 @@ TEST(Wire, IntegerAndFloatFormatsMapToTheirKinds) {
   }
 }
 
-std::string Nested(std::size_t depth) {
-  return std::string(depth, '\x91') + '\xc0';
-}
+std::string Nested(std::size_t depth) { return std::string(depth, '\x91') + '\xc0'; }
 
 TEST(Wire, DepthCountsEveryContainerUpToSixtyFour) {
-  // The envelope and the body are two of the 64.
-  EXPECT_TRUE(DecodeValue(Nested(62)));
-  FrameDecoder decoder;
-  decoder.Feed(std::string("\x93\x01\x01\x81\xa1v", 6) + Nested(63));
-  EXPECT_FALSE(decoder.Next());
-  EXPECT_EQ(decoder.error(), FrameError::kTooDeep);
+  EXPECT_TRUE(DecodeValue(Nested(62)));  // the envelope and the body are two of the 64
 }
 
 TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
@@ -133,6 +120,7 @@ TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
       {"fixext", envelope + std::string("\x81\xa1v\xd4\x01\x00", 6), FrameError::kExtValue},
       {"ext8 in array", envelope + std::string("\x81\xa1v\x91\xc7\x01\x05\x00", 8),
        FrameError::kExtValue},
+      {"65 containers", envelope + std::string("\x81\xa1v", 3) + Nested(63), FrameError::kTooDeep},
   };
   for (const Case& c : cases) {
     FrameDecoder decoder;
@@ -145,21 +133,20 @@ TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
   }
 }
 
-TEST(WireErrors, FrameOverSixteenMebibytesIsTooBig) {
-  // bin32 header claiming 16 MiB: with the envelope the frame exceeds the limit, which the
-  // decoder notices before the last byte arrives.
-  std::string header("\x93\x01\x01\x81\xa1v\xc6\x01\x00\x00\x00", 11);
+// [1, 1, {"v": bin32 of `payload` bytes}]: 11 bytes of header and the payload.
+std::string BinFrame(std::size_t payload) {
+  std::string frame("\x93\x01\x01\x81\xa1v\xc6", 7);
+  for (int shift = 24; shift >= 0; shift -= 8) frame += static_cast<char>((payload >> shift) & 0xff);
+  return frame + std::string(payload, 'y');
+}
+
+TEST(WireErrors, FrameOverSixteenMebibytesIsTooBigBeforeItsLastByteArrives) {
   FrameDecoder decoder;
-  decoder.Feed(header);
-  decoder.Feed(std::string(kMaxFrameBytes - header.size() + 1, 'x'));
+  decoder.Feed(BinFrame(kMaxFrameBytes).substr(0, kMaxFrameBytes + 1));
   EXPECT_FALSE(decoder.Next());
   EXPECT_EQ(decoder.error(), FrameError::kTooBig);
 
-  // Just under the limit is fine.
-  const std::size_t payload = kMaxFrameBytes - header.size();
-  std::string fits("\x93\x01\x01\x81\xa1v\xc6", 7);
-  for (int shift = 24; shift >= 0; shift -= 8) fits += static_cast<char>((payload >> shift) & 0xff);
-  fits += std::string(payload, 'y');
+  const std::string fits = BinFrame(kMaxFrameBytes - 11);
   ASSERT_EQ(fits.size(), kMaxFrameBytes);
   FrameDecoder fitting;
   fitting.Feed(fits);

@@ -1,18 +1,11 @@
 // End-to-end helpers for tests that talk to the real `lumeris-fileservice` over its socket.
 //
-// ServiceProcess starts the program (found through LUMERIS_FILESERVICE, else the path the build
-// compiled in) with the test's current environment and stops it with SIGTERM. RawConnection is a
-// plain socket client that speaks the wire itself, so tests exercise the bytes other clients send.
-// ServiceTest is a GoogleTest fixture with an isolated user environment and a running service:
-//
-//   TEST_F(ServiceTest, AnswersUnknownSearch) {
-//     std::optional<MessageValue> reply = sendRequest(Command("search_xyz"));
-//     ASSERT_TRUE(reply);
-//     expectNoReply(Command("add"));
-//   }
-//
-// Link the CMake target `lumeris_service_fixture` to get the program built and its path defined.
-// Not thread-safe: use from the test's main thread.
+// ServiceProcess starts the program (LUMERIS_FILESERVICE, else the path the build compiled in) in
+// the test's environment and stops it with a signal. RawConnection is a plain blocking socket client
+// that speaks the wire itself, so tests exercise the bytes other clients send. ServiceTest is a
+// fixture with an isolated user environment and a running service. Link the CMake target
+// `lumeris_service_fixture` to get the program built and its path defined.
+// Not thread-safe: each object belongs to one thread.
 #pragma once
 
 #include <errno.h>
@@ -30,6 +23,7 @@
 #include <chrono>
 #include <filesystem>
 #include <optional>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <thread>
@@ -49,11 +43,18 @@ using namespace std::chrono_literals;
 
 inline std::filesystem::path FileServiceProgram() {
   if (const char* path = getenv("LUMERIS_FILESERVICE"); path && *path) return path;
-#ifdef LUMERIS_TEST_FILESERVICE
   return LUMERIS_TEST_FILESERVICE;
-#else
-  return "lumeris-fileservice";
-#endif
+}
+
+// A Unix stream socket connected to `path`, or -1. The caller owns the descriptor.
+inline int ConnectUnixSocket(const std::filesystem::path& path) {
+  int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  strncpy(address.sun_path, path.c_str(), sizeof address.sun_path - 1);
+  if (connect(fd, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0) return fd;
+  close(fd);
+  return -1;
 }
 
 // A request dictionary with "command" and further keys.
@@ -65,21 +66,13 @@ inline MessageValue Command(std::string command,
   return request;
 }
 
-// A plain blocking Unix socket client with timeouts.
 class RawConnection {
  public:
   static std::optional<RawConnection> Open(const std::filesystem::path& path) {
-    int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    strncpy(address.sun_path, path.c_str(), sizeof address.sun_path - 1);
-    if (connect(fd, reinterpret_cast<sockaddr*>(&address), sizeof address) != 0) {
-      close(fd);
-      return std::nullopt;
-    }
+    int fd = ConnectUnixSocket(path);
+    if (fd < 0) return std::nullopt;
     return RawConnection(fd);
   }
-
   RawConnection(RawConnection&& other) noexcept
       : fd_(std::exchange(other.fd_, -1)), next_id_(other.next_id_) {}
   RawConnection& operator=(RawConnection&&) = delete;
@@ -103,7 +96,6 @@ class RawConnection {
     SendBytes(EncodeFrame(Frame{kind, id, body}));
     return id;
   }
-  // Ends this side's writing (the peer sees end of stream).
   void CloseWriting() { shutdown(fd_, SHUT_WR); }
 
   // The next frame, or std::nullopt after `timeout` or when the peer closed.
@@ -111,18 +103,10 @@ class RawConnection {
     const auto deadline = std::chrono::steady_clock::now() + timeout;
     while (true) {
       if (std::optional<Frame> frame = decoder_.Next()) return frame;
-      if (peer_closed_ || decoder_.error()) return std::nullopt;
-      if (!WaitReadable(deadline)) return std::nullopt;
-      char buffer[65536];
-      ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
-      if (n <= 0) {
-        peer_closed_ = true;
-        continue;
-      }
-      decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
+      if (peer_closed_ || decoder_.error() || !ReadSome(deadline)) return std::nullopt;
     }
   }
-  // The body of the reply to `id`, skipping nothing: the next frame must be that reply.
+  // The body of the next frame, which must be the reply to `id`.
   std::optional<MessageValue> ReadReply(std::uint64_t id, std::chrono::milliseconds timeout = 2s) {
     std::optional<Frame> frame = ReadFrame(timeout);
     if (!frame || frame->kind != FrameKind::kReply || frame->id != id) return std::nullopt;
@@ -132,10 +116,7 @@ class RawConnection {
   bool WaitForPeerClose(std::chrono::milliseconds timeout = 3s) {
     const auto deadline = std::chrono::steady_clock::now() + timeout;
     while (!peer_closed_) {
-      if (!WaitReadable(deadline)) return false;
-      char buffer[65536];
-      ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
-      if (n <= 0) peer_closed_ = true;
+      if (!ReadSome(deadline)) return false;
     }
     return true;
   }
@@ -143,12 +124,20 @@ class RawConnection {
  private:
   explicit RawConnection(int fd) : fd_(fd) {}
 
-  bool WaitReadable(std::chrono::steady_clock::time_point deadline) {
-    auto left = std::chrono::duration_cast<std::chrono::milliseconds>(
+  // Reads what is there into the decoder (or notes the peer's close); false on timeout.
+  bool ReadSome(std::chrono::steady_clock::time_point deadline) {
+    const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(
         deadline - std::chrono::steady_clock::now());
-    if (left.count() <= 0) return false;
     pollfd waiting{fd_, POLLIN, 0};
-    return poll(&waiting, 1, static_cast<int>(left.count())) > 0;
+    if (left.count() <= 0 || poll(&waiting, 1, static_cast<int>(left.count())) <= 0) return false;
+    char buffer[65536];
+    ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
+    if (n <= 0) {
+      peer_closed_ = true;
+    } else {
+      decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
+    }
+    return true;
   }
 
   int fd_;
@@ -157,7 +146,6 @@ class RawConnection {
   bool peer_closed_ = false;
 };
 
-// The real service program running in the current environment.
 class ServiceProcess {
  public:
   ServiceProcess() = default;
@@ -175,45 +163,35 @@ class ServiceProcess {
       pid_ = -1;
       return false;
     }
-    const auto deadline = std::chrono::steady_clock::now() + 5s;
-    while (std::chrono::steady_clock::now() < deadline) {
+    for (const auto deadline = std::chrono::steady_clock::now() + 5s;
+         std::chrono::steady_clock::now() < deadline && !Exited();
+         std::this_thread::sleep_for(2ms)) {
       if (RawConnection::Open(socket)) return true;
-      if (Exited()) return false;
-      std::this_thread::sleep_for(2ms);
     }
     return false;
   }
 
   // True when the process has ended (reaping it).
   bool Exited() {
-    if (pid_ <= 0) return true;
-    if (waitpid(pid_, &status_, WNOHANG) == pid_) {
-      pid_ = -1;
-      return true;
-    }
-    return false;
+    if (pid_ > 0 && waitpid(pid_, &status_, WNOHANG) == pid_) pid_ = -1;
+    return pid_ <= 0;
   }
 
-  // Sends SIGTERM and waits for the end (SIGKILL after 5 s). Returns the wait status.
+  // Sends `signal_number`, waits for the end (SIGKILL after 5 s) and returns the wait status.
   int Stop(int signal_number = SIGTERM) {
-    if (pid_ <= 0) return status_;
-    kill(pid_, signal_number);
-    const auto deadline = std::chrono::steady_clock::now() + 5s;
-    while (!Exited()) {
+    if (pid_ > 0) kill(pid_, signal_number);
+    for (const auto deadline = std::chrono::steady_clock::now() + 5s; !Exited();
+         std::this_thread::sleep_for(2ms)) {
       if (std::chrono::steady_clock::now() > deadline) kill(pid_, SIGKILL);
-      std::this_thread::sleep_for(2ms);
     }
     return status_;
   }
-
-  pid_t pid() const { return pid_; }
 
  private:
   pid_t pid_ = -1;
   int status_ = 0;
 };
 
-// A fixture with an isolated user environment and a running service.
 class ServiceTest : public ::testing::Test {
  protected:
   void SetUp() override {
@@ -225,19 +203,18 @@ class ServiceTest : public ::testing::Test {
 
   RawConnection Connect() {
     std::optional<RawConnection> connection = RawConnection::Open(socket_path_);
-    EXPECT_TRUE(connection) << "cannot connect to " << socket_path_;
-    if (!connection) throw std::runtime_error("no connection");
+    if (!connection) throw std::runtime_error("cannot connect to " + socket_path_.string());
     return std::move(*connection);
   }
 
-  // Sends `request` as a message wanting a reply on a new connection; returns the reply body.
+  // Sends `request` wanting a reply on a new connection; returns the reply body.
   std::optional<MessageValue> sendRequest(const MessageValue& request,
                                           std::chrono::milliseconds timeout = 2s) {
     RawConnection connection = Connect();
     return connection.ReadReply(connection.SendMessage(request), timeout);
   }
 
-  // Sends `request` (wanting a reply) and checks that nothing comes back within `wait`.
+  // Sends `request` wanting a reply and checks that nothing comes back within `wait`.
   void expectNoReply(const MessageValue& request, std::chrono::milliseconds wait = 300ms) {
     RawConnection connection = Connect();
     connection.SendMessage(request);
