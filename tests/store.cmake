@@ -2,9 +2,7 @@
 # counting notification sink, and end-to-end tests through the real service.
 lumeris_add_gtest(store_test
   SOURCES
-    store/store_lists_test.cc
-    store/skin_tones_state_test.cc
-    store/json_payload_test.cc
+    store/store_test.cc
     store/store_operations_test.cc
   LIBS lumeris_store
   LABELS store)

@@ -24,11 +24,12 @@ class DistributedNotificationsTest : public ::testing::Test {
     if (std::getenv("DBUS_SESSION_BUS_ADDRESS") == nullptr) GTEST_SKIP() << "no session bus (source scripts/test-env.sh)";
   }
 
-  // Everything `observer` receives within `wait`.
+  // What `observer` receives within `wait`, up to `count` notifications.
   static std::vector<DistributedNotification> Collect(DistributedNotificationObserver& observer,
+                                                      std::optional<std::size_t> count,
                                                       std::chrono::milliseconds wait) {
     std::vector<DistributedNotification> seen;
-    observer.Run([&](const DistributedNotification& n) { seen.push_back(n); }, {.timeout = wait});
+    observer.Run([&](const DistributedNotification& n) { seen.push_back(n); }, {.max_count = count, .timeout = wait});
     return seen;
   }
 };
@@ -37,12 +38,11 @@ TEST_F(DistributedNotificationsTest, PostReachesObserverExactlyOnce) {
   auto observer = DistributedNotificationObserver::Open(kLMLumerisRecentsChangedNotification);
   ASSERT_NE(observer, nullptr);
   ASSERT_TRUE(PostDistributedNotification(kLMLumerisRecentsChangedNotification));
-  std::vector<DistributedNotification> seen;
-  observer->Run([&](const DistributedNotification& n) { seen.push_back(n); }, {.max_count = 1, .timeout = 5000ms});
+  std::vector<DistributedNotification> seen = Collect(*observer, 1, 5000ms);
   ASSERT_EQ(seen.size(), 1u);
   EXPECT_EQ(seen[0].name, kLMLumerisRecentsChangedNotification);
   EXPECT_EQ(seen[0].object, "");
-  EXPECT_TRUE(Collect(*observer, 300ms).empty()) << "delivered more than once";
+  EXPECT_TRUE(Collect(*observer, std::nullopt, 300ms).empty()) << "delivered more than once";
 }
 
 TEST_F(DistributedNotificationsTest, ObserverSeesOnlyItsNameInPostingOrder) {
@@ -53,13 +53,12 @@ TEST_F(DistributedNotificationsTest, ObserverSeesOnlyItsNameInPostingOrder) {
   PostDistributedNotification("Unwanted", "x");
   PostDistributedNotification("Wanted", "first");
   PostDistributedNotification("Wanted", "second");
-
-  std::vector<std::string> objects;
-  named->Run([&](const DistributedNotification& n) { objects.push_back(n.object); }, {.max_count = 2, .timeout = 5000ms});
-  EXPECT_EQ(objects, (std::vector<std::string>{"first", "second"}));
-  std::vector<std::string> names;
-  all->Run([&](const DistributedNotification& n) { names.push_back(n.name); }, {.max_count = 3, .timeout = 5000ms});
-  EXPECT_EQ(names, (std::vector<std::string>{"Unwanted", "Wanted", "Wanted"}));
+  std::vector<std::string> seen;
+  for (const DistributedNotification& n : Collect(*named, 2, 5000ms)) seen.push_back(n.name + ":" + n.object);
+  EXPECT_EQ(seen, (std::vector<std::string>{"Wanted:first", "Wanted:second"}));
+  seen.clear();
+  for (const DistributedNotification& n : Collect(*all, 3, 5000ms)) seen.push_back(n.name);
+  EXPECT_EQ(seen, (std::vector<std::string>{"Unwanted", "Wanted", "Wanted"}));
 }
 
 TEST_F(DistributedNotificationsTest, StopEndsRunFromAnotherThread) {

@@ -74,7 +74,7 @@ class PreferenceStoreTest : public ::testing::Test {
   }
   static std::string ReadBytes(const fs::path& path) {
     std::ifstream in(path, std::ios::binary);
-    return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    return std::string(std::istreambuf_iterator<char>(in), {});
   }
   std::vector<fs::path> CorruptCopies() const {
     std::vector<fs::path> found;
@@ -90,23 +90,18 @@ class PreferenceStoreTest : public ::testing::Test {
   PreferenceStore store_;
 };
 
-TEST_F(PreferenceStoreTest, SetChangesViewAtOnceButFileOnlyOnSynchronize) {
+TEST_F(PreferenceStoreTest, SetAndRemoveChangeTheViewAtOnceAndTheFileOnSynchronize) {
+  WriteDomainFile(plist::Dictionary{{"keep", 1}, {"drop", 2}});
   Set("Recents:x", Value(plist::Array{"a", "b"}));
+  Set("drop", std::nullopt);
   ASSERT_TRUE(Copy("Recents:x").has_value());
   EXPECT_TRUE(*Copy("Recents:x") == Value(plist::Array{"a", "b"}));
-  EXPECT_FALSE(fs::exists(DomainFile()));
+  EXPECT_FALSE(Copy("drop").has_value());
+  EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"keep", 1}, {"drop", 2}}));
 
   ASSERT_TRUE(Synchronize());
   EXPECT_EQ(ReadBytes(DomainFile()).substr(0, 8), "bplist00");
-  EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"Recents:x", plist::Array{"a", "b"}}}));
-}
-
-TEST_F(PreferenceStoreTest, NullRemovesKeyFromViewAndFile) {
-  WriteDomainFile(plist::Dictionary{{"keep", 1}, {"drop", 2}});
-  Set("drop", std::nullopt);
-  EXPECT_FALSE(Copy("drop").has_value());
-  ASSERT_TRUE(Synchronize());
-  EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"keep", 1}}));
+  EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"keep", 1}, {"Recents:x", plist::Array{"a", "b"}}}));
 }
 
 TEST_F(PreferenceStoreTest, TwoWritersMergeKeyByKey) {
@@ -173,7 +168,8 @@ TEST_F(PreferenceStoreTest, CorruptFileReadsEmptyAndIsKeptAsideBeforeNextWrite) 
   EXPECT_EQ(ReadBytes(CorruptCopies()[0]), "this is not a property list");
   EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "v"}}));
 
-  // A second corrupt file in the same second does not overwrite the first copy.
+  // A second corrupt file in the same second does not overwrite the first copy; a file whose
+  // root is not a dictionary is corrupt too.
   WriteDomainFileBytes("bplist00 also broken");
   ASSERT_TRUE(Synchronize());
   Set("k", "w");
@@ -181,33 +177,26 @@ TEST_F(PreferenceStoreTest, CorruptFileReadsEmptyAndIsKeptAsideBeforeNextWrite) 
   ASSERT_EQ(CorruptCopies().size(), 2u);
   EXPECT_EQ(ReadBytes(CorruptCopies()[0]), "this is not a property list");
   EXPECT_EQ(ReadBytes(CorruptCopies()[1]), "bplist00 also broken");
-}
-
-TEST_F(PreferenceStoreTest, FileWhoseRootIsNotADictionaryCountsAsCorrupt) {
   WriteDomainFile(plist::Array{1, 2});
+  ASSERT_TRUE(Synchronize());
   Set("k", 1);
   ASSERT_TRUE(Synchronize());
-  EXPECT_EQ(CorruptCopies().size(), 1u);
+  EXPECT_EQ(CorruptCopies().size(), 3u);
   EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", 1}}));
 }
 
 // Failure paths: the file stays as it was and the change stays pending for the next try.
 TEST_F(PreferenceStoreTest, FailedStepsLeaveFileAndKeepChangesPending) {
-  struct Case {
-    const char* name;
-    bool ScriptedFileSystem::*failure;
-  };
-  for (const Case& c : {Case{"write", &ScriptedFileSystem::fail_writes}, Case{"lock", &ScriptedFileSystem::fail_lock},
-                        Case{"read", &ScriptedFileSystem::fail_reads}}) {
-    SCOPED_TRACE(c.name);
+  for (bool ScriptedFileSystem::*failure :
+       {&ScriptedFileSystem::fail_writes, &ScriptedFileSystem::fail_lock, &ScriptedFileSystem::fail_reads}) {
     WriteDomainFile(plist::Dictionary{{"k", "file"}});
     PreferenceStore store(file_system_);
     ASSERT_TRUE(Synchronize(&store));
     WriteDomainFile(plist::Dictionary{{"k", "file"}, {"other", 1}});  // forces a re-read under the lock
     Set("k", "pending", &store);
-    (*file_system_).*c.failure = true;
+    (*file_system_).*failure = true;
     EXPECT_FALSE(Synchronize(&store));
-    (*file_system_).*c.failure = false;
+    (*file_system_).*failure = false;
     EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "file"}, {"other", 1}}));
     EXPECT_EQ(*Copy("k", &store)->AsString(), "pending");
     ASSERT_TRUE(Synchronize(&store));
@@ -227,12 +216,11 @@ TEST(PreferencesPathTest, ScopesMapToXdgFiles) {
   testing::IsolatedUserEnvironment env;
   const std::string host = PreferencesHostId();
   ASSERT_FALSE(host.empty());
-  struct Case {
+  const struct {
     PreferencesUser user;
     PreferencesHost host;
     fs::path expected;
-  };
-  const Case cases[] = {
+  } cases[] = {
       {kCFPreferencesCurrentUser, kCFPreferencesAnyHost, env.config_home() / "vantorel/Preferences/d.plist"},
       {kCFPreferencesCurrentUser, kCFPreferencesCurrentHost,
        env.config_home() / ("vantorel/Preferences/ByHost/d." + host + ".plist")},
@@ -240,7 +228,7 @@ TEST(PreferencesPathTest, ScopesMapToXdgFiles) {
       {kCFPreferencesAnyUser, kCFPreferencesCurrentHost,
        env.config_dirs() / ("vantorel/Preferences/ByHost/d." + host + ".plist")},
   };
-  for (const Case& c : cases) {
+  for (const auto& c : cases) {
     SCOPED_TRACE(c.expected);
     EXPECT_EQ(PreferencesFilePath("d", c.user, c.host), c.expected);
   }
@@ -276,15 +264,12 @@ TEST(PreferencesPathTest, DomainsThatCannotNameAFileHaveNoPath) {
 // The CFPreferences functions on the shared store.
 TEST(CFPreferencesTest, IntegerAndBooleanReadersFollowTheValueType) {
   testing::IsolatedUserEnvironment env;
-  struct Case {
+  const struct {
     const char* name;
     std::optional<Value> value;
     std::int64_t integer;
-    bool integer_valid;
-    bool boolean;
-    bool boolean_valid;
-  };
-  const Case cases[] = {
+    bool integer_valid, boolean, boolean_valid;
+  } cases[] = {
       {"absent", std::nullopt, 0, false, false, false},
       {"integer", Value(42), 42, true, false, false},
       {"negative", Value(-7), -7, true, false, false},
@@ -294,7 +279,7 @@ TEST(CFPreferencesTest, IntegerAndBooleanReadersFollowTheValueType) {
       {"real", Value(1.0), 0, false, false, false},
       {"array", Value(plist::Array{1}), 0, false, false, false},
   };
-  for (const Case& c : cases) {
+  for (const auto& c : cases) {
     SCOPED_TRACE(c.name);
     CFPreferencesSetAppValue("key", c.value, "test.readers");
     ASSERT_TRUE(CFPreferencesAppSynchronize("test.readers"));

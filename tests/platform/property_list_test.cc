@@ -32,35 +32,20 @@ Value Nested(int depth) {
   return value;
 }
 
-struct RoundTripCase {
-  const char* name;
-  Value value;
-};
-
-std::vector<RoundTripCase> RoundTripCases() {
+std::vector<std::pair<const char*, Value>> RoundTripCases() {
   return {
-      {"empty_string", Value()},
-      {"ascii_string", Value("Sorvendi")},
+      {"empty_string", Value()}, {"ascii_string", Value("Sorvendi")},
       {"non_ascii_string", Value("caf\u00e9 \u65e5\u672c \U0001F600")},
-      {"zero", Value(0)},
-      {"small_int", Value(255)},
-      {"two_byte_int", Value(256)},
-      {"four_byte_int", Value(std::int64_t{1} << 31)},
-      {"large_int", Value(std::int64_t{1} << 40)},
-      {"negative_int", Value(-1)},
-      {"int64_min", Value(std::numeric_limits<std::int64_t>::min())},
+      {"zero", Value(0)}, {"small_int", Value(255)}, {"two_byte_int", Value(256)},
+      {"four_byte_int", Value(std::int64_t{1} << 31)}, {"large_int", Value(std::int64_t{1} << 40)},
+      {"negative_int", Value(-1)}, {"int64_min", Value(std::numeric_limits<std::int64_t>::min())},
       {"int64_max", Value(std::numeric_limits<std::int64_t>::max())},
-      {"real", Value(0.1)},
-      {"negative_real", Value(-1.5e300)},
-      {"true", Value(true)},
-      {"false", Value(false)},
-      {"date", Value(Date{725846400})},
-      {"date_before_epoch", Value(Date{-86400 * 365})},
-      {"empty_data", Value(Data{})},
-      {"data", Value(Data{0, 1, 0xfe, 0xff, 0x80})},
-      {"empty_array", Value(Array{})},
-      {"empty_dictionary", Value(Dictionary{})},
+      {"real", Value(0.1)}, {"negative_real", Value(-1.5e300)}, {"true", Value(true)}, {"false", Value(false)},
+      {"date", Value(Date{725846400})}, {"date_before_epoch", Value(Date{-86400 * 365})},
+      {"empty_data", Value(Data{})}, {"data", Value(Data{0, 1, 0xfe, 0xff, 0x80})},
+      {"empty_array", Value(Array{})}, {"empty_dictionary", Value(Dictionary{})},
       {"mixed_array", Value(Array{1, "two", 3.5, true, Data{9}})},
+      {"deep_nesting_within_limit", Nested(kMaxPropertyListDepth - 1)},
       {"nested",
        Value(Dictionary{{"recents", Array{"\U0001F600", "\u2764\uFE0F"}},
                         {"skin", Dictionary{{"\U0001F44D", 3}, {"nested", Dictionary{{"deep", Array{Array{}}}}}}},
@@ -72,20 +57,13 @@ std::vector<RoundTripCase> RoundTripCases() {
 class PropertyListRoundTrip : public ::testing::TestWithParam<Format> {};
 
 TEST_P(PropertyListRoundTrip, EveryTypeSurvivesUnchanged) {
-  for (const RoundTripCase& c : RoundTripCases()) {
-    SCOPED_TRACE(c.name);
-    std::optional<Value> back = RoundTrip(c.value, GetParam());
+  for (const auto& [name, value] : RoundTripCases()) {
+    SCOPED_TRACE(name);
+    std::optional<Value> back = RoundTrip(value, GetParam());
     ASSERT_TRUE(back.has_value());
-    EXPECT_EQ(back->type(), c.value.type());
-    EXPECT_TRUE(*back == c.value);
+    EXPECT_EQ(back->type(), value.type());
+    EXPECT_TRUE(*back == value);
   }
-}
-
-TEST_P(PropertyListRoundTrip, DeepNestingWithinLimitSurvives) {
-  Value deep = Nested(kMaxPropertyListDepth - 1);
-  std::optional<Value> back = RoundTrip(deep, GetParam());
-  ASSERT_TRUE(back.has_value());
-  EXPECT_TRUE(*back == deep);
 }
 
 INSTANTIATE_TEST_SUITE_P(Formats, PropertyListRoundTrip, ::testing::Values(Format::kBinary, Format::kXml),
@@ -101,35 +79,25 @@ TEST(PropertyListIo, BinaryDatesKeepSubSecondPrecisionOnBothSidesOfTheEpoch) {
   }
 }
 
-TEST(PropertyListValue, WrongTypeReadsAsAbsent) {
+// A wrong-typed value reads as absent; equality is deep and never converts between types.
+TEST(PropertyListValue, AccessorsAndEqualityAreTypeStrict) {
   Value integer = 7;
-  EXPECT_EQ(integer.AsString(), nullptr);
-  EXPECT_EQ(integer.AsReal(), nullptr);
-  EXPECT_EQ(integer.AsBool(), nullptr);
+  EXPECT_TRUE(integer.AsString() == nullptr && integer.AsReal() == nullptr && integer.AsBool() == nullptr);
   EXPECT_EQ(integer.Find("x"), nullptr);
   ASSERT_NE(integer.AsInteger(), nullptr);
   EXPECT_EQ(*integer.AsInteger(), 7);
-
   Value text = "1";
-  EXPECT_EQ(text.AsInteger(), nullptr);
-  EXPECT_EQ(text.AsArray(), nullptr);
-  EXPECT_EQ(text.AsDictionary(), nullptr);
-}
+  EXPECT_TRUE(text.AsInteger() == nullptr && text.AsArray() == nullptr && text.AsDictionary() == nullptr);
 
-TEST(PropertyListValue, EqualityIsDeepAndTypeStrict) {
   EXPECT_FALSE(Value(1) == Value(1.0));
   EXPECT_FALSE(Value(1) == Value(true));
   EXPECT_FALSE(Value("1") == Value(1));
-  EXPECT_TRUE(Value(Dictionary{{"a", Array{1, 2}}}) == Value(Dictionary{{"a", Array{1, 2}}}));
   EXPECT_FALSE(Value(Dictionary{{"a", Array{1, 2}}}) == Value(Dictionary{{"a", Array{2, 1}}}));
-}
 
-TEST(PropertyListValue, FindReturnsMemberAndMutationThroughAccessorsSticks) {
   Value dict = Dictionary{{"k", "v"}};
-  ASSERT_NE(dict.Find("k"), nullptr);
-  EXPECT_EQ(*dict.Find("k")->AsString(), "v");
   EXPECT_EQ(dict.Find("missing"), nullptr);
   (*dict.AsDictionary())["k"] = 5;
+  ASSERT_NE(dict.Find("k"), nullptr);
   EXPECT_EQ(*dict.Find("k")->AsInteger(), 5);
 }
 
@@ -156,13 +124,7 @@ TEST(PropertyListIo, ReadsXmlWrittenByOtherTools) {
   EXPECT_TRUE(*parsed == expected);
 }
 
-TEST(PropertyListIo, BinaryOutputIsBinaryFormat) {
-  std::vector<std::uint8_t> bytes = SerializeBinaryPropertyList(Dictionary{{"a", 1}});
-  ASSERT_GE(bytes.size(), 8u);
-  EXPECT_EQ(std::string(bytes.begin(), bytes.begin() + 8), "bplist00");
-}
-
-TEST(PropertyListIo, ReadsFileFromDisk) {
+TEST(PropertyListIo, ReadsFilesAndMissingOnesReadAsNothing) {
   testing::ScopedTempDir dir;
   Value value = Dictionary{{"k", Array{"x", 2}}};
   std::vector<std::uint8_t> bytes = SerializeBinaryPropertyList(value);
@@ -171,6 +133,8 @@ TEST(PropertyListIo, ReadsFileFromDisk) {
   std::optional<Value> read = ReadPropertyListFile(dir.path() / "a.plist");
   ASSERT_TRUE(read.has_value());
   EXPECT_TRUE(*read == value);
+  EXPECT_FALSE(ReadPropertyListFile(dir.path() / "absent.plist").has_value());
+  EXPECT_FALSE(ReadPropertyListFile(dir.path()).has_value());
 }
 
 // Error paths: nothing that fails to parse crashes or yields a value.
@@ -185,6 +149,7 @@ TEST(PropertyListIoErrors, UnparsableInputReadsAsNothing) {
       {"magic_only", {'b', 'p', 'l', 'i', 's', 't', '0', '0'}},
       {"truncated_binary", truncated},
       {"corrupt_trailer", bad_trailer},
+      {"nesting_beyond_limit", SerializeBinaryPropertyList(Nested(kMaxPropertyListDepth + 1))},
   };
   for (const auto& [name, bytes] : cases) {
     SCOPED_TRACE(name);
@@ -195,16 +160,6 @@ TEST(PropertyListIoErrors, UnparsableInputReadsAsNothing) {
     SCOPED_TRACE(xml);
     EXPECT_FALSE(ParsePropertyList(Bytes(xml)).has_value());
   }
-}
-
-TEST(PropertyListIoErrors, NestingBeyondLimitReadsAsNothing) {
-  EXPECT_FALSE(ParsePropertyList(SerializeBinaryPropertyList(Nested(kMaxPropertyListDepth + 1))).has_value());
-}
-
-TEST(PropertyListIoErrors, MissingFileReadsAsNothing) {
-  testing::ScopedTempDir dir;
-  EXPECT_FALSE(ReadPropertyListFile(dir.path() / "absent.plist").has_value());
-  EXPECT_FALSE(ReadPropertyListFile(dir.path()).has_value());
 }
 
 }  // namespace

@@ -18,15 +18,7 @@ namespace {
 
 using ::testing::ElementsAre;
 using ::testing::Optional;
-using testing::Command;
-using testing::EmojiID;
-using testing::PlainID;
-using testing::RawConnection;
-using testing::SeedDomain;
-using testing::StoredDomain;
-using testing::StoredList;
-using testing::StoredValue;
-using StringVector = std::vector<std::string>;
+using namespace testing;  // lumeris::testing
 using namespace std::chrono_literals;
 
 constexpr char kId[] = "test.identifier";
@@ -54,7 +46,7 @@ std::optional<std::string> Payload(const MessageValue& reply, std::string_view k
   return std::string(bytes->begin(), bytes->end());
 }
 
-class StoreServiceTest : public testing::ServiceTest {
+class StoreServiceTest : public ServiceTest {
  protected:
   void SetUp() override {
     if (std::getenv("DBUS_SESSION_BUS_ADDRESS") == nullptr) GTEST_SKIP() << "no session bus (source scripts/test-env.sh)";
@@ -77,20 +69,16 @@ class StoreServiceTest : public testing::ServiceTest {
                        {{"identifier", Str(std::move(identifier))}, {"application", Str(std::move(application))}}));
   }
   std::optional<StringVector> read(std::string target, std::string identifier = kId) {
-    return ReplyList(ask(Command("read", {{"target", Str(std::move(target))}, {"identifier", Str(std::move(identifier))}})),
-                   "array");
+    return ReplyList(ask(Command("read", {{"target", Str(target)}, {"identifier", Str(identifier)}})), "array");
   }
-  void add(std::string item, std::string identifier = kId) {
-    send(Command("add", {{"target", Str("recents")}, {"item", Str(std::move(item))}, {"identifier", Str(std::move(identifier))}}));
+  void add(std::string item) {
+    send(Command("add", {{"target", Str("recents")}, {"item", Str(item)}, {"identifier", Str(kId)}}));
   }
   void set(std::string target, MessageValue array, std::string identifier = kId) {
-    send(Command("set", {{"target", Str(std::move(target))}, {"array", std::move(array)}, {"identifier", Str(std::move(identifier))}}));
+    send(Command("set", {{"target", Str(target)}, {"array", std::move(array)}, {"identifier", Str(identifier)}}));
   }
-  void setSkinTone(std::string item) {
-    send(Command("set_skintone", {{"item", Str(std::move(item))}, {"identifier", Str(kId)}}));
-  }
-  void saveState(std::string_view data, std::string application = "app") {
-    send(Command("save_state", {{"data", MessageValue::DataFromBytes(data)}, {"application", Str(std::move(application))}}));
+  void saveState(std::string_view data) {
+    send(Command("save_state", {{"data", MessageValue::DataFromBytes(data)}, {"application", Str("app")}}));
   }
   // Waits until every request sent so far has been handled.
   void settle() { ask(Command("read", {{"target", Str("favorites")}, {"identifier", Str("settle")}})); }
@@ -110,20 +98,17 @@ class StoreServiceTest : public testing::ServiceTest {
 };
 
 TEST_F(StoreServiceTest, AddingAnExistingItemMovesItToTheFrontWithTheNewText) {
-  for (const std::string& item : {PlainID("a"), EmojiID(testing::kThumbsUp), PlainID("b")}) add(item);
-  add(EmojiID(testing::kThumbsUpDark));
-  EXPECT_THAT(read("recents"), Optional(ElementsAre(EmojiID(testing::kThumbsUpDark), PlainID("b"), PlainID("a"))));
+  for (const std::string& item : {PlainID("a"), EmojiID(kThumbsUp), PlainID("b")}) add(item);
+  add(EmojiID(kThumbsUpDark));
+  EXPECT_THAT(read("recents"), Optional(ElementsAre(EmojiID(kThumbsUpDark), PlainID("b"), PlainID("a"))));
   EXPECT_EQ(notifications(), 4u);
   EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
-              Optional(ElementsAre(EmojiID(testing::kThumbsUpDark), PlainID("b"), PlainID("a"))));
+              Optional(ElementsAre(EmojiID(kThumbsUpDark), PlainID("b"), PlainID("a"))));
 }
 
 TEST_F(StoreServiceTest, TheDefaultIdentifierConvertsTheOlderListsExactlyOnce) {
-  auto old_items = [](const char* character) {
-    return plist::Array{plist::Dictionary{{"String", character}}};
-  };
-  SeedDomain(kInputMethodDomain, {{"VTRecentItems", old_items("R")}});
-  SeedDomain(kOlderServerDomain, {{"SorvexFavorites", old_items("F")}});
+  SeedDomain(kInputMethodDomain, {{"VTRecentItems", plist::Array{plist::Dictionary{{"String", "R"}}}}});
+  SeedDomain(kOlderServerDomain, {{"SorvexFavorites", plist::Array{plist::Dictionary{{"String", "F"}}}}});
 
   MessageValue first = readAll(std::string(kDefaultDataStorageIdentifier));
   EXPECT_THAT(ReplyList(first, "recents"), Optional(ElementsAre(PlainID("R"))));
@@ -134,28 +119,25 @@ TEST_F(StoreServiceTest, TheDefaultIdentifierConvertsTheOlderListsExactlyOnce) {
 
   set("recents", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
   set("favorites", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
-  MessageValue again = readAll(std::string(kDefaultDataStorageIdentifier));
-  EXPECT_TRUE(again.Find("recents")->is_null());
-  EXPECT_TRUE(again.Find("favorites")->is_null());
-
-  MessageValue other = readAll("other.identifier");
-  EXPECT_TRUE(other.Find("recents")->is_null());
-  EXPECT_TRUE(other.Find("favorites")->is_null());
+  for (const std::string& identifier : {std::string(kDefaultDataStorageIdentifier), std::string("other.identifier")}) {
+    MessageValue again = readAll(identifier);
+    EXPECT_TRUE(again.Find("recents")->is_null()) << identifier;
+    EXPECT_TRUE(again.Find("favorites")->is_null()) << identifier;
+  }
   EXPECT_FALSE(StoredValue(StoreKey(kRecentsKeyPrefix, "other.identifier")));
 }
 
 TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstRecentsReadNotByAFavoritesRead) {
-  SeedDomain(kStoreDomain, {{"Favorites:test.identifier", plist::Array{"f"}}, {"Leftover", 1}});
+  SeedStore({{"Favorites:test.identifier", plist::Array{"f"}}, {"Leftover", 1}});
   EXPECT_THAT(read("favorites"), Optional(ElementsAre("f")));
   EXPECT_TRUE(StoredDomain().contains("Leftover"));
-
   EXPECT_FALSE(read("recents"));
   EXPECT_FALSE(read("favorites"));
   EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}}}));
 }
 
 TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstWrite) {
-  SeedDomain(kStoreDomain, {{"Recents:test.identifier", plist::Array{"r"}}, {"Leftover", 1}});
+  SeedStore({{"Recents:test.identifier", plist::Array{"r"}}, {"Leftover", 1}});
   set("favorites", Strings({"f"}));
   settle();
   EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}},
@@ -164,14 +146,14 @@ TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstWrite) {
 }
 
 TEST_F(StoreServiceTest, HorseRacingWithAModifierIsReadPlainWhileTheStoredTextKeepsIt) {
-  set("recents", Strings({PlainID(testing::kHorseRacingLight), PlainID("a")}));
-  EXPECT_THAT(read("recents"), Optional(ElementsAre(PlainID(testing::kHorseRacing), PlainID("a"))));
+  set("recents", Strings({PlainID(kHorseRacingLight), PlainID("a")}));
+  EXPECT_THAT(read("recents"), Optional(ElementsAre(PlainID(kHorseRacing), PlainID("a"))));
   EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
-              Optional(ElementsAre(PlainID(testing::kHorseRacingLight), PlainID("a"))));
+              Optional(ElementsAre(PlainID(kHorseRacingLight), PlainID("a"))));
 }
 
 TEST_F(StoreServiceTest, StoringAnEmptyRecentsListRemovesTheSkinTonesAndNotifiesOnce) {
-  set("recents", Strings({EmojiID(testing::kThumbsUpMedium)}));
+  set("recents", Strings({EmojiID(kThumbsUpMedium)}));
   EXPECT_EQ(notifications(), 1u);
   ASSERT_TRUE(StoredValue(StoreKey(kSkinTonesKeyPrefix, kId)));
 
@@ -193,19 +175,19 @@ TEST_F(StoreServiceTest, SetSkinToneRecordsOnlySkinToneEmojiInTheEmojiFont) {
     std::optional<std::string> skintones;  // the reply's "skintones" afterwards
     std::size_t notifications;
   };
-  const std::string thumbs = std::string("{\"") + testing::kThumbsUp + "\":\"";
+  const std::string thumbs = std::string("{\"") + kThumbsUp + "\":\"";
   const Case cases[] = {
-      {"emoji font, skin tone", EmojiID(testing::kThumbsUpMedium), thumbs + testing::kThumbsUpMedium + "\"}", 1},
-      {"other font", "com.vantorel.lmk:{\"char\":\"" + std::string(testing::kThumbsUpDark) + "\",\"font\":\"Courier\"}",
-       thumbs + testing::kThumbsUpMedium + "\"}", 0},
-      {"no skin tone", EmojiID(testing::kThumbsUp), thumbs + testing::kThumbsUp + "\"}", 1},
+      {"emoji font, skin tone", EmojiID(kThumbsUpMedium), thumbs + kThumbsUpMedium + "\"}", 1},
+      {"other font", "com.vantorel.lmk:{\"char\":\"" + std::string(kThumbsUpDark) + "\",\"font\":\"Courier\"}",
+       thumbs + kThumbsUpMedium + "\"}", 0},
+      {"no skin tone", EmojiID(kThumbsUp), thumbs + kThumbsUp + "\"}", 1},
       {"empty", "", std::nullopt, 1},
   };
   // Writing the history runs no version check, so the first recents read of an unversioned
   // domain would wipe it: version the domain first, as the panel's first read does.
   readAll();
   for (const Case& c : cases) {
-    setSkinTone(c.item);
+    send(Command("set_skintone", {{"item", Str(c.item)}, {"identifier", Str(kId)}}));
     EXPECT_EQ(notifications(), c.notifications) << c.name;
     EXPECT_EQ(Payload(readAll(), "skintones"), c.skintones) << c.name;
   }
@@ -237,14 +219,14 @@ TEST_F(StoreServiceTest, ReadRecentsFavoritesReturnsTheFourValues) {
   EXPECT_EQ(empty.Find("skintones"), nullptr);
   EXPECT_EQ(Payload(empty, "state"), "{}");
 
-  add(EmojiID(testing::kThumbsUpMedium));
+  add(EmojiID(kThumbsUpMedium));
   set("favorites", Strings({PlainID("f1"), PlainID("f2")}));
-  saveState(R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})", "app");
+  saveState(R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})");
   MessageValue full = readAll();
-  EXPECT_THAT(ReplyList(full, "recents"), Optional(ElementsAre(EmojiID(testing::kThumbsUpMedium))));
+  EXPECT_THAT(ReplyList(full, "recents"), Optional(ElementsAre(EmojiID(kThumbsUpMedium))));
   EXPECT_THAT(ReplyList(full, "favorites"), Optional(ElementsAre(PlainID("f1"), PlainID("f2"))));
   EXPECT_EQ(Payload(full, "skintones"),
-            "{\"" + std::string(testing::kThumbsUp) + "\":\"" + testing::kThumbsUpMedium + "\"}");
+            "{\"" + std::string(kThumbsUp) + "\":\"" + kThumbsUpMedium + "\"}");
   EXPECT_EQ(Payload(full, "state"), R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})");
 }
 
@@ -273,11 +255,12 @@ TEST_F(StoreServiceTest, ConcurrentAddsLoseOnlyToTheLastStoreAndKeepOtherKeys) {
   std::atomic<bool> adding{true};
   std::atomic<int> torn_reads{0};
   std::atomic<int> answered{0};
+  auto item_of = [](int c, int n) { return PlainID("c" + std::to_string(c) + "-" + std::to_string(n)); };
 
   std::thread watcher([&] {
     while (adding) {
-      if (std::filesystem::exists(testing::DomainFile(kStoreDomain)) &&
-          !plist::ReadPropertyListFile(testing::DomainFile(kStoreDomain))) {
+      if (std::filesystem::exists(DomainFile(kStoreDomain)) &&
+          !plist::ReadPropertyListFile(DomainFile(kStoreDomain))) {
         ++torn_reads;
       }
     }
@@ -287,10 +270,9 @@ TEST_F(StoreServiceTest, ConcurrentAddsLoseOnlyToTheLastStoreAndKeepOtherKeys) {
     writers.emplace_back([&, c] {
       RawConnection connection = *RawConnection::Open(socket_path_);
       for (int n = 0; n < kAddsEach; ++n) {
-        connection.SendMessage(Command("add", {{"target", Str("recents")},
-                                               {"item", Str(PlainID("c" + std::to_string(c) + "-" + std::to_string(n)))},
-                                               {"identifier", Str(kId)}}),
-                               FrameKind::kNoReply);
+        connection.SendMessage(
+            Command("add", {{"target", Str("recents")}, {"item", Str(item_of(c, n))}, {"identifier", Str(kId)}}),
+            FrameKind::kNoReply);
       }
       const std::uint64_t id =
           connection.SendMessage(Command("read", {{"target", Str("favorites")}, {"identifier", Str("settle")}}));
@@ -305,14 +287,13 @@ TEST_F(StoreServiceTest, ConcurrentAddsLoseOnlyToTheLastStoreAndKeepOtherKeys) {
 
   EXPECT_EQ(answered, kConnections);
   EXPECT_EQ(torn_reads, 0);
-  std::size_t posted = 0;
-  posted += observer_->Run([](const DistributedNotification&) {},
-                           {.max_count = kConnections * kAddsEach, .timeout = 10s});
-  EXPECT_EQ(posted, static_cast<std::size_t>(kConnections * kAddsEach)) << "every add stored once";
+  EXPECT_EQ(observer_->Run([](const DistributedNotification&) {}, {.max_count = kConnections * kAddsEach, .timeout = 10s}),
+            static_cast<std::size_t>(kConnections * kAddsEach))
+      << "every add stored once";
 
   std::set<std::string> added;
   for (int c = 0; c < kConnections; ++c) {
-    for (int n = 0; n < kAddsEach; ++n) added.insert(PlainID("c" + std::to_string(c) + "-" + std::to_string(n)));
+    for (int n = 0; n < kAddsEach; ++n) added.insert(item_of(c, n));
   }
   const std::optional<StringVector> recents = read("recents");
   ASSERT_TRUE(recents);

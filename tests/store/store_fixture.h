@@ -1,14 +1,6 @@
-// A fixture for the user data store's unit tests: an isolated user environment whose preference
-// files the test seeds and reads back directly, and a counting notification sink.
-//
-//   TEST_F(StoreTest, ...) {
-//     seedStore({{"version", 1}, {"Recents:x", plist::Array{"a"}}});
-//     AddRecentID("b", "x");
-//     EXPECT_EQ(storedList("Recents:x"), (std::vector<std::string>{"b", "a"}));
-//     EXPECT_EQ(posts(), 1);
-//   }
-//
-// Not thread-safe apart from the post counter: use from the test's main thread.
+// Helpers for the user data store's tests: entity IDs as the panel writes them, preference files
+// seeded and read back directly, and a fixture with an isolated user environment and a counting
+// notification sink. Not thread-safe apart from the post counter.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -22,7 +14,6 @@
 #include <vector>
 
 #include "platform/preferences_paths.h"
-#include "platform/property_list.h"
 #include "platform/property_list_io.h"
 #include "store/change_notification.h"
 #include "store/store_keys.h"
@@ -30,7 +21,8 @@
 
 namespace lumeris::testing {
 
-// Entity IDs as the panel writes them.
+using StringVector = std::vector<std::string>;
+
 inline std::string EmojiID(std::string_view character) {
   return "com.vantorel.lmk:{\"char\":\"" + std::string(character) + "\",\"font\":\"VantorelColorEmoji\"}";
 }
@@ -44,70 +36,52 @@ inline constexpr char kThumbsUpDark[] = "\xF0\x9F\x91\x8D\xF0\x9F\x8F\xBF";    /
 inline constexpr char kHorseRacing[] = "\xF0\x9F\x8F\x87";                  // U+1F3C7
 inline constexpr char kHorseRacingLight[] = "\xF0\x9F\x8F\x87\xF0\x9F\x8F\xBB";
 inline constexpr char kGrinning[] = "\xF0\x9F\x98\x80";  // U+1F600, takes no skin tone
-inline constexpr std::string_view kDefaultIdentifier = kDefaultDataStorageIdentifier;
 
-// The string entries of a stored list; std::nullopt when `value` is absent or not a list.
-inline std::optional<std::vector<std::string>> StringsOf(const std::optional<plist::Value>& value) {
+// The string entries of a list; std::nullopt when `value` is absent or not a list.
+inline std::optional<StringVector> StringsOf(const std::optional<plist::Value>& value) {
   if (!value || !value->AsArray()) return std::nullopt;
-  std::vector<std::string> strings;
+  StringVector strings;
   for (const plist::Value& entry : *value->AsArray()) {
     if (const std::string* text = entry.AsString()) strings.push_back(*text);
   }
   return strings;
 }
-inline plist::Array IDArray(const std::vector<std::string>& strings) {
-  return plist::Array(strings.begin(), strings.end());
+inline std::optional<StringVector> StringsOf(const std::optional<plist::Array>& array) {
+  return array ? StringsOf(std::optional<plist::Value>(*array)) : std::nullopt;
 }
 
-// The file of `domain` for the current user, any host.
 inline std::filesystem::path DomainFile(std::string_view domain) {
   return *PreferencesFilePath(domain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
 }
 
-// Writes `contents` as the whole file of `domain`, as a new file renamed into place so that a
-// store that has read the old one sees the change.
+// Replaces the file of `domain` by renaming a new file into place, so a store that has read the
+// old one sees the change.
 inline void SeedDomain(std::string_view domain, const plist::Dictionary& contents) {
   const std::filesystem::path path = DomainFile(domain);
   std::filesystem::create_directories(path.parent_path());
   const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(plist::Value(contents));
-  std::filesystem::path temporary = path;
-  temporary += ".seed";
+  const std::filesystem::path temporary = path.string() + ".seed";
   std::ofstream(temporary, std::ios::binary)
       .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
   std::filesystem::rename(temporary, path);
 }
+inline void SeedStore(const plist::Dictionary& contents) { SeedDomain(kStoreDomain, contents); }
 
-// The file of `domain` as it is on disk (empty when missing).
+// The file of `domain` as it is on disk (empty when missing or unreadable).
 inline plist::Dictionary StoredDomain(std::string_view domain = kStoreDomain) {
   std::optional<plist::Value> file = plist::ReadPropertyListFile(DomainFile(domain));
-  if (!file || !file->AsDictionary()) return {};
-  return *file->AsDictionary();
+  return file && file->AsDictionary() ? *file->AsDictionary() : plist::Dictionary{};
 }
-
 inline std::optional<plist::Value> StoredValue(std::string_view key) {
   plist::Dictionary domain = StoredDomain();
   auto found = domain.find(key);
-  if (found == domain.end()) return std::nullopt;
-  return found->second;
+  return found == domain.end() ? std::nullopt : std::optional<plist::Value>(found->second);
 }
-
-// The string entries of the list stored under `key`; std::nullopt when none is stored.
-inline std::optional<std::vector<std::string>> StoredList(std::string_view key) {
-  return StringsOf(StoredValue(key));
-}
+inline std::optional<StringVector> StoredList(std::string_view key) { return StringsOf(StoredValue(key)); }
 
 class StoreTest : public ::testing::Test {
  protected:
   StoreTest() : sink_([this] { ++posts_; }) {}
-
-  static void seedDomain(std::string_view domain, const plist::Dictionary& contents) {
-    SeedDomain(domain, contents);
-  }
-  static void seedStore(const plist::Dictionary& contents) { SeedDomain(kStoreDomain, contents); }
-  static plist::Dictionary storedDomain(std::string_view domain = kStoreDomain) { return StoredDomain(domain); }
-  static std::optional<plist::Value> storedValue(std::string_view key) { return StoredValue(key); }
-  static std::optional<std::vector<std::string>> storedList(std::string_view key) { return StoredList(key); }
-
   int posts() const { return posts_.load(); }
   void resetPosts() { posts_ = 0; }
 
