@@ -2,7 +2,6 @@
 //
 //   BundleWriter app = BundleWriter::Application(dir.path() / "Test.app", "com.example.Test", "en");
 //   app.WriteStringsTable("de", "Localizable", {{"Hello", "Hallo"}});
-//   std::optional<Bundle> bundle = Bundle::Open(app.path());
 //
 // Not thread-safe; use from the test's main thread. Files are owned by the caller's temp dir.
 #pragma once
@@ -13,7 +12,6 @@
 #include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "platform/property_list.h"
 #include "platform/property_list_io.h"
@@ -23,82 +21,66 @@ namespace lumeris::testing {
 
 class BundleWriter {
  public:
+  using Path = std::filesystem::path;
+  using Maybe = std::optional<std::string>;
+
   // An application bundle: Contents/Info.plist, resources in Contents/Resources.
-  static BundleWriter Application(const std::filesystem::path& path, std::optional<std::string> identifier,
-                                  std::optional<std::string> development_localization) {
-    BundleWriter writer(path, path / "Contents" / "Resources", path / "Contents" / "Info.plist");
-    writer.WriteInfo(identifier, development_localization);
-    return writer;
+  static BundleWriter Application(const Path& path, Maybe identifier, Maybe development_localization) {
+    return BundleWriter(path, path / "Contents/Resources", path / "Contents/Info.plist", identifier,
+                        development_localization);
   }
-
   // A framework bundle: Resources/Info.plist, resources in Resources.
-  static BundleWriter Framework(const std::filesystem::path& path, std::optional<std::string> identifier,
-                                std::optional<std::string> development_localization) {
-    BundleWriter writer(path, path / "Resources", path / "Resources" / "Info.plist");
-    writer.WriteInfo(identifier, development_localization);
-    return writer;
+  static BundleWriter Framework(const Path& path, Maybe identifier, Maybe development_localization) {
+    return BundleWriter(path, path / "Resources", path / "Resources/Info.plist", identifier,
+                        development_localization);
   }
 
-  const std::filesystem::path& path() const { return path_; }
-  const std::filesystem::path& resources() const { return resources_; }
-  const std::filesystem::path& info_file() const { return info_file_; }
+  const Path& path() const { return path_; }
+  const Path& info_file() const { return info_file_; }
 
   // The folder of `localization` ("" for the non-localized folder), created on demand.
-  std::filesystem::path Folder(std::string_view localization) const {
-    std::filesystem::path folder =
-        localization.empty() ? resources_ : resources_ / (std::string(localization) + ".lproj");
+  Path Folder(std::string_view localization) const {
+    Path folder = localization.empty() ? resources_ : resources_ / (std::string(localization) + ".lproj");
     std::filesystem::create_directories(folder);
     return folder;
   }
-
   // Writes `relative` (e.g. "Icons/Star.pdf") into the folder of `localization`.
-  std::filesystem::path WriteResource(std::string_view localization, const std::filesystem::path& relative,
-                                      std::string_view contents) const {
-    const std::filesystem::path file = Folder(localization) / relative;
-    WriteFile(file, contents);
-    return file;
+  Path WriteResource(std::string_view localization, const Path& relative, std::string_view contents) const {
+    WriteFile(Folder(localization) / relative, contents);
+    return Folder(localization) / relative;
   }
-
   // Writes "<table>.strings" as a binary property-list dictionary from key to string.
-  std::filesystem::path WriteStringsTable(std::string_view localization, std::string_view table,
-                                          const std::map<std::string, std::string>& strings) const {
-    plist::Dictionary dictionary;
-    for (const auto& [key, value] : strings) dictionary.emplace(key, value);
+  Path WriteStringsTable(std::string_view localization, std::string_view table,
+                         const std::map<std::string, std::string>& strings) const {
+    plist::Dictionary dictionary(strings.begin(), strings.end());
     return WritePlist(Folder(localization) / (std::string(table) + ".strings"), dictionary);
   }
 
-  static std::filesystem::path WritePlist(const std::filesystem::path& file, const plist::Value& value) {
+  static Path WritePlist(const Path& file, const plist::Value& value) {
     const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(value);
     WriteFile(file, std::string_view(reinterpret_cast<const char*>(bytes.data()), bytes.size()));
     return file;
   }
-
-  static void WriteFile(const std::filesystem::path& file, std::string_view contents) {
+  static void WriteFile(const Path& file, std::string_view contents) {
     std::filesystem::create_directories(file.parent_path());
-    std::ofstream out(file, std::ios::binary | std::ios::trunc);
-    out.write(contents.data(), static_cast<std::streamsize>(contents.size()));
+    std::ofstream(file, std::ios::binary | std::ios::trunc) << contents;
   }
 
  private:
-  BundleWriter(std::filesystem::path path, std::filesystem::path resources, std::filesystem::path info_file)
+  BundleWriter(Path path, Path resources, Path info_file, const Maybe& identifier, const Maybe& development)
       : path_(std::move(path)), resources_(std::move(resources)), info_file_(std::move(info_file)) {
     std::filesystem::create_directories(resources_);
-  }
-
-  void WriteInfo(const std::optional<std::string>& identifier, const std::optional<std::string>& development) const {
     plist::Dictionary info{{"CFBundleName", path_.stem().string()}};
     if (identifier) info.emplace("CFBundleIdentifier", *identifier);
     if (development) info.emplace("CFBundleDevelopmentRegion", *development);
     WritePlist(info_file_, info);
   }
 
-  std::filesystem::path path_;
-  std::filesystem::path resources_;
-  std::filesystem::path info_file_;
+  Path path_, resources_, info_file_;
 };
 
-// Sets the user's languages for one test: LANGUAGE as given, the locale variables cleared
-// except LANG (restored afterwards).
+// Sets the user's languages for one test: LANGUAGE as given, LANG as given, LC_ALL and
+// LC_MESSAGES cleared (all restored when `env` ends).
 inline void SetUserLanguages(ScopedEnv& env, std::optional<std::string> language_list,
                              std::optional<std::string> lang = std::nullopt) {
   env.Set("LANGUAGE", language_list);

@@ -1,3 +1,5 @@
+// The bundle reader: layouts, resource lookup order, localized strings, old-style localization
+// names and ICU matching of localizations, bad bundles, and the system root.
 #include "platform/bundle.h"
 
 #include <gtest/gtest.h>
@@ -6,9 +8,11 @@
 #include <optional>
 #include <ostream>
 #include <string>
+#include <vector>
 
 #include "bundle/bundle_fixture.h"
 #include "lumeris/config.h"
+#include "platform/bundle_localization.h"
 #include "platform/system_root.h"
 #include "support/scoped_env.h"
 #include "support/temp_dir.h"
@@ -20,6 +24,7 @@ namespace fs = std::filesystem;
 using testing::BundleWriter;
 using testing::ScopedEnv;
 using testing::ScopedTempDir;
+using Strings = std::vector<std::string>;
 
 // An application bundle with a non-localized folder and en, de and fr folders, used with the
 // user's languages set to "de:fr" unless a test says otherwise.
@@ -35,101 +40,87 @@ class BundleTest : public ::testing::Test {
     return bundle.value_or(*Bundle::Open(dir_.path()));
   }
 
-  // The folder ("" for the non-localized one, else the localization) a found path lies in.
-  std::optional<std::string> FolderOf(const std::optional<fs::path>& found,
-                                      const fs::path& relative) const {
-    if (!found) return std::nullopt;
-    for (const char* folder : {"", "en", "de", "fr", "English"}) {
-      if (*found == app_.Folder(folder) / relative) return std::string(folder);
-    }
-    return "elsewhere: " + found->string();
-  }
-
   ScopedTempDir dir_;
   ScopedEnv env_;
   BundleWriter app_;
 };
 
-TEST_F(BundleTest, ApplicationLayoutReadsInfoAndLocalizations) {
+TEST_F(BundleTest, ApplicationAndFrameworkLayouts) {
   for (const char* loc : {"fr", "en", "de", "zh-Hant"}) app_.Folder(loc);
   app_.WriteResource("", "notes.lproj", "a file, not a folder");
-  fs::create_directories(app_.resources() / ".lproj");
-
+  fs::create_directories(app_.Folder("") / ".lproj");
   const Bundle bundle = OpenApp();
   EXPECT_EQ(bundle.identifier(), "com.example.Test");
   EXPECT_EQ(bundle.development_localization(), "en");
   EXPECT_EQ(bundle.resources_directory(), app_.path() / "Contents" / "Resources");
-  EXPECT_EQ(bundle.localizations(), (std::vector<std::string>{"de", "en", "fr", "zh-Hant"}));
-  ASSERT_NE(bundle.info_dictionary().find("CFBundleName"), bundle.info_dictionary().end());
-}
+  EXPECT_EQ(bundle.localizations(), (Strings{"de", "en", "fr", "zh-Hant"}));
+  EXPECT_EQ(bundle.info_dictionary().count("CFBundleName"), 1u);
 
-TEST_F(BundleTest, FrameworkLayoutKeepsEverythingInResources) {
+  // A framework keeps everything, Info.plist included, in Resources.
   const BundleWriter framework = BundleWriter::Framework(dir_.path() / "Kit.framework", "com.example.Kit", "en");
   framework.WriteStringsTable("en", "Localizable", {{"Done", "Done"}});
   const fs::path icon = framework.WriteResource("", "Star.pdf", "%PDF");
-
-  const std::optional<Bundle> bundle = Bundle::Open(framework.path());
-  ASSERT_TRUE(bundle);
-  EXPECT_EQ(bundle->identifier(), "com.example.Kit");
-  EXPECT_EQ(bundle->localizations(), (std::vector<std::string>{"en"}));
-  EXPECT_EQ(bundle->PathForResource("Star", "pdf"), icon);
+  const std::optional<Bundle> kit = Bundle::Open(framework.path());
+  ASSERT_TRUE(kit);
+  EXPECT_EQ(kit->identifier(), "com.example.Kit");
+  EXPECT_EQ(kit->localizations(), (Strings{"en"}));
+  EXPECT_EQ(kit->PathForResource("Star", "pdf"), icon);
 }
-
-struct LookupCase {
-  const char* what;
-  const char* name;
-  const char* type;
-  const char* subdirectory;
-  std::optional<std::string> localization;
-  std::optional<std::string> found_in;  // folder the result must lie in; nullopt: not found
-  friend void PrintTo(const LookupCase& c, std::ostream* os) { *os << c.what; }
-};
-
-class ResourceLookupTest : public BundleTest, public ::testing::WithParamInterface<LookupCase> {};
 
 // Every resource "<folder>-only" exists in that folder alone; "Everywhere" exists in all.
-TEST_P(ResourceLookupTest, SearchesFoldersInOrder) {
-  const LookupCase& c = GetParam();
-  const std::string type = c.type;
-  const auto file = [&](const std::string& name) { return fs::path(c.subdirectory) / (type.empty() ? name : name + "." + type); };
-  for (const char* folder : {"", "en", "de", "fr"}) {
-    app_.WriteResource(folder, file(std::string(*folder ? folder : "base") + "-only"), folder);
-    app_.WriteResource(folder, file("Everywhere"), folder);
+TEST_F(BundleTest, ResourceLookupSearchesFoldersInOrder) {
+  const std::optional<std::string> none;
+  const struct {
+    const char *what, *name, *type, *subdirectory;
+    std::optional<std::string_view> localization;
+    std::optional<std::string> found_in;  // folder the result must lie in
+  } cases[] = {
+      {"non-localized folder first", "Everywhere", "plist", "", none, ""},
+      {"non-localized first even with a localization", "Everywhere", "plist", "", "fr", ""},
+      {"first preferred localization", "de-only", "plist", "", none, "de"},
+      {"second preferred localization", "fr-only", "plist", "", none, "fr"},
+      {"development localization last", "en-only", "plist", "", none, "en"},
+      {"the localization asked for", "fr-only", "plist", "", "fr", "fr"},
+      {"only the localization asked for", "de-only", "plist", "", "fr", none},
+      {"no development fallback for an explicit localization", "en-only", "plist", "", "fr", none},
+      {"old-style name finds its code's folder", "en-only", "plist", "", "English", "en"},
+      {"sub-directory", "fr-only", "pdf", "Icons/Small", none, "fr"},
+      {"empty type is the bare name", "de-only", "", "", none, "de"},
+      {"unknown localization", "de-only", "plist", "", "ja", none},
+      {"missing resource", "nowhere", "plist", "", none, none},
+  };
+  const char* folders[] = {"", "en", "de", "fr"};
+  const auto file = [](fs::path subdirectory, const std::string& name, const std::string& type) {
+    return subdirectory / (type.empty() ? name : name + "." + type);
+  };
+  using Kind = std::pair<const char*, const char*>;
+  for (const auto& [subdirectory, type] : {Kind{"", "plist"}, Kind{"Icons/Small", "pdf"}, Kind{"", ""}}) {
+    for (const char* folder : folders) {
+      app_.WriteResource(folder, file(subdirectory, std::string(*folder ? folder : "base") + "-only", type), folder);
+      app_.WriteResource(folder, file(subdirectory, "Everywhere", type), folder);
+    }
   }
   const Bundle bundle = OpenApp();
-  const auto found = bundle.PathForResource(c.name, c.type, c.subdirectory, c.localization);
-  EXPECT_EQ(FolderOf(found, file(c.name)), c.found_in) << c.what;
+  for (const auto& c : cases) {
+    const auto found = bundle.PathForResource(c.name, c.type, c.subdirectory, c.localization);
+    std::optional<std::string> found_in = found ? std::optional<std::string>("elsewhere") : none;
+    for (const char* folder : folders) {
+      if (found == app_.Folder(folder) / file(c.subdirectory, c.name, c.type)) found_in = folder;
+    }
+    EXPECT_EQ(found_in, c.found_in) << c.what << ": " << (found ? found->string() : "not found");
+  }
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Order, ResourceLookupTest,
-    ::testing::Values(
-        LookupCase{"non-localized folder first", "Everywhere", "plist", "", std::nullopt, ""},
-        LookupCase{"non-localized first even with a localization", "Everywhere", "plist", "", "fr", ""},
-        LookupCase{"first preferred localization", "de-only", "plist", "", std::nullopt, "de"},
-        LookupCase{"second preferred localization", "fr-only", "plist", "", std::nullopt, "fr"},
-        LookupCase{"development localization last", "en-only", "plist", "", std::nullopt, "en"},
-        LookupCase{"the localization asked for", "fr-only", "plist", "", "fr", "fr"},
-        LookupCase{"only the localization asked for", "de-only", "plist", "", "fr", std::nullopt},
-        LookupCase{"no development fallback for an explicit localization", "en-only", "plist", "", "fr", std::nullopt},
-        LookupCase{"old-style name finds its code's folder", "en-only", "plist", "", "English", "en"},
-        LookupCase{"sub-directory", "fr-only", "pdf", "Icons/Small", std::nullopt, "fr"},
-        LookupCase{"empty type is the bare name", "de-only", "", "", std::nullopt, "de"},
-        LookupCase{"unknown localization", "de-only", "plist", "", "ja", std::nullopt},
-        LookupCase{"missing resource", "nowhere", "plist", "", std::nullopt, std::nullopt}));
+TEST_F(BundleTest, CodeFindsOldStyleFolderAndUnmatchedLanguagesUseDevelopment) {
+  const fs::path english = app_.WriteResource("English", "Note.txt", "x");
+  EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "en"), english);
 
-TEST_F(BundleTest, CodeFindsOldStyleFolder) {
-  const fs::path file = app_.WriteResource("English", "Note.txt", "x");
-  EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "en"), file);
-}
-
-TEST_F(BundleTest, LanguagesWithoutMatchUseDevelopmentLocalization) {
   testing::SetUserLanguages(env_, "ja");
-  const fs::path en = app_.WriteResource("en", "Note.txt", "x");
-  app_.WriteResource("de", "Note.txt", "x");
+  const fs::path en = app_.WriteResource("en", "Other.txt", "x");
+  app_.WriteResource("de", "Other.txt", "x");
   const Bundle bundle = OpenApp();
-  EXPECT_EQ(bundle.PreferredLocalizations(), (std::vector<std::string>{"en"}));
-  EXPECT_EQ(bundle.PathForResource("Note", "txt"), en);
+  EXPECT_EQ(bundle.PreferredLocalizations(), (Strings{"en"}));
+  EXPECT_EQ(bundle.PathForResource("Other", "txt"), en);
 }
 
 TEST_F(BundleTest, LocalizedStringFollowsUserLanguages) {
@@ -148,24 +139,55 @@ TEST_F(BundleTest, LocalizedStringFollowsUserLanguages) {
   EXPECT_EQ(bundle.LocalizedString("Hello", "fallback", std::nullopt), "Hello");
 }
 
+TEST(OldStyleLocalizationTest, NamesAndCodesMapBothWaysAndNothingElseIsOldStyle) {
+  for (const auto& [name, code] : std::vector<std::pair<std::string, std::string>>{
+           {"English", "en"}, {"French", "fr"}, {"German", "de"}, {"Japanese", "ja"},
+           {"Spanish", "es"}, {"Italian", "it"}, {"Dutch", "nl"}}) {
+    EXPECT_EQ(LanguageCodeForOldStyleLocalization(name), code);
+    EXPECT_EQ(OldStyleLocalizationForLanguageCode(code), name);
+  }
+  for (const char* name : {"en", "english", "Base", "", "zh-Hans", "Klingon"}) {
+    EXPECT_FALSE(LanguageCodeForOldStyleLocalization(name)) << name;
+  }
+  EXPECT_FALSE(OldStyleLocalizationForLanguageCode("en-US"));
+}
+
+TEST(PreferredLocalizationsFromArrayTest, MatchesWithIcu) {
+  const struct {
+    const char* what;
+    Strings localizations, preferences, expected;
+  } cases[] = {
+      {"script variants and old-style names", {"English", "de", "zh-Hant"}, {"zh-TW", "en-GB"}, {"zh-Hant", "English"}},
+      {"simplified Chinese is not traditional", {"zh-Hans", "zh-Hant"}, {"zh-CN"}, {"zh-Hans"}},
+      {"one entry per localization, preference order", {"en", "de", "fr"}, {"de-CH", "fr-CA", "de-AT"}, {"de", "fr"}},
+      {"exact region wins", {"pt", "pt-PT"}, {"pt-PT"}, {"pt-PT"}},
+      {"other region takes the bare language", {"pt", "pt-PT"}, {"pt-BR"}, {"pt"}},
+      {"script subtag", {"sr", "sr-Latn"}, {"sr-Latn-RS"}, {"sr-Latn"}},
+      {"old-style name matches its code", {"German", "fr"}, {"de"}, {"German"}},
+      {"names that are not languages never match", {"Base", "not a tag", "en"}, {"en-US"}, {"en"}},
+      {"unparsable preferences are skipped", {"en", "fr"}, {"!!", "fr"}, {"fr"}},
+      {"unrelated language", {"en", "de"}, {"ja"}, {}},
+      {"no preferences", {"en", "de"}, {}, {}},
+      {"no localizations", {}, {"en"}, {}},
+      {"only unusable localizations", {"Base"}, {"en"}, {}},
+  };
+  for (const auto& c : cases) {
+    EXPECT_EQ(PreferredLocalizationsFromArray(c.localizations, c.preferences), c.expected) << c.what;
+  }
+}
+
 // Error paths: nothing found, nothing thrown, nothing outside the bundle.
 
-TEST(BundleErrorTest, OpenNeedsADirectory) {
+TEST(BundleErrorTest, OpenNeedsADirectoryAndBadInfoLeavesInfoEmpty) {
   ScopedTempDir dir;
   BundleWriter::WriteFile(dir.path() / "file.app", "not a bundle");
   EXPECT_FALSE(Bundle::Open(dir.path() / "file.app"));
   EXPECT_FALSE(Bundle::Open(dir.path() / "missing.app"));
-}
 
-TEST(BundleErrorTest, BadInfoPlistLeavesInfoEmpty) {
-  ScopedTempDir dir;
   const BundleWriter app = BundleWriter::Application(dir.path() / "A.app", std::nullopt, std::nullopt);
-  const auto open_with_info = [&](std::string_view contents) {
-    BundleWriter::WriteFile(app.info_file(), contents);
-    return Bundle::Open(app.path());
-  };
   for (const char* contents : {"", "bplist00 truncated", "<plist><dict><key>a</key></plist>"}) {
-    const auto bundle = open_with_info(contents);
+    BundleWriter::WriteFile(app.info_file(), contents);
+    const auto bundle = Bundle::Open(app.path());
     ASSERT_TRUE(bundle);
     EXPECT_TRUE(bundle->info_dictionary().empty());
     EXPECT_FALSE(bundle->identifier());
@@ -185,16 +207,19 @@ TEST_F(BundleTest, LookupsNeverLeaveTheBundle) {
   app_.WriteResource("de", "ok.txt", "inside");
   const Bundle bundle = OpenApp();
   ASSERT_TRUE(bundle.PathForResource("ok", "txt", {}, "de"));
-
-  EXPECT_FALSE(bundle.PathForResource("../secret", "txt"));
-  EXPECT_FALSE(bundle.PathForResource("..", ""));
-  EXPECT_FALSE(bundle.PathForResource("", "txt"));
-  EXPECT_FALSE(bundle.PathForResource("secret", "txt", ".."));
-  EXPECT_FALSE(bundle.PathForResource("secret", "txt", "../../.."));
-  EXPECT_FALSE(bundle.PathForResource("secret", "txt", dir_.path().string()));
-  EXPECT_FALSE(bundle.PathForResource("secret", "txt/../../secret"));
-  EXPECT_FALSE(bundle.PathForResource("ok", "txt", {}, "../Resources/de"));
-  EXPECT_FALSE(bundle.PathForResource("ok", "txt", {}, ""));
+  const std::string outside = dir_.path().string();
+  const struct {
+    const char *name, *type, *subdirectory, *localization;
+  } escapes[] = {{"../secret", "txt", "", nullptr},     {"..", "", "", nullptr},
+                 {"", "txt", "", nullptr},              {"secret", "txt", "..", nullptr},
+                 {"secret", "txt", "../../..", nullptr}, {"secret", "txt", outside.c_str(), nullptr},
+                 {"secret", "txt/../../secret", "", nullptr}, {"ok", "txt", "", "../Resources/de"},
+                 {"ok", "txt", "", ""}};
+  for (const auto& e : escapes) {
+    const auto localization = e.localization ? std::optional<std::string_view>(e.localization) : std::nullopt;
+    EXPECT_FALSE(bundle.PathForResource(e.name, e.type, e.subdirectory, localization))
+        << e.name << " " << e.type << " " << e.subdirectory << " " << localization.value_or("(none)");
+  }
 }
 
 TEST(ReadStringsTableTest, AcceptsOnlyDictionaries) {
@@ -205,37 +230,29 @@ TEST(ReadStringsTableTest, AcceptsOnlyDictionaries) {
   ASSERT_TRUE(table);
   EXPECT_EQ(table->at("Key"), plist::Value("Wert"));
 
-  const fs::path array = BundleWriter::WritePlist(dir.path() / "array.strings", plist::Array{"Key"});
-  const fs::path garbage = dir.path() / "garbage.strings";
-  BundleWriter::WriteFile(garbage, "\"Key\" = \"Wert\";");
-  EXPECT_FALSE(ReadStringsTable(array));
-  EXPECT_FALSE(ReadStringsTable(garbage));
+  BundleWriter::WriteFile(dir.path() / "garbage.strings", "\"Key\" = \"Wert\";");
+  EXPECT_FALSE(ReadStringsTable(BundleWriter::WritePlist(dir.path() / "array.strings", plist::Array{"Key"})));
+  EXPECT_FALSE(ReadStringsTable(dir.path() / "garbage.strings"));
   EXPECT_FALSE(ReadStringsTable(dir.path() / "missing.strings"));
 }
 
-struct RootCase {
-  std::optional<std::string> variable;
-  const char* system_path;
-  bool uses_default;
-  friend void PrintTo(const RootCase& c, std::ostream* os) { *os << c.variable.value_or("(unset)") << " " << c.system_path; }
-};
-
-class SystemRootTest : public ::testing::TestWithParam<RootCase> {};
-
-TEST_P(SystemRootTest, ResolvesUnderTheRoot) {
-  ScopedEnv env;
-  env.Set("LUMERIS_SYSTEM_ROOT", GetParam().variable);
-  const fs::path root = GetParam().uses_default ? fs::path(config::kSystemRootDefault) : fs::path(*GetParam().variable);
-  EXPECT_EQ(SystemRoot(), root);
-  EXPECT_EQ(SystemPath(GetParam().system_path), root / "System" / "Library" / "Input Methods" / "Sorvendi.app");
+TEST(SystemRootTest, ResolvesUnderTheRoot) {
+  const struct {
+    std::optional<std::string> variable;
+    const char* system_path;
+    bool uses_default;
+  } cases[] = {{"/tmp/root", "/System/Library/Input Methods/Sorvendi.app", false},
+               {"/tmp/root", "System/Library/Input Methods/Sorvendi.app", false},
+               {std::nullopt, "/System/Library/Input Methods/Sorvendi.app", true},
+               {"", "//System/Library/Input Methods/Sorvendi.app", true}};
+  for (const auto& c : cases) {
+    ScopedEnv env;
+    env.Set("LUMERIS_SYSTEM_ROOT", c.variable);
+    const fs::path root = c.uses_default ? fs::path(config::kSystemRootDefault) : fs::path(*c.variable);
+    EXPECT_EQ(SystemRoot(), root) << c.variable.value_or("(unset)");
+    EXPECT_EQ(SystemPath(c.system_path), root / "System/Library/Input Methods/Sorvendi.app") << c.system_path;
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Roots, SystemRootTest,
-    ::testing::Values(RootCase{"/tmp/root", "/System/Library/Input Methods/Sorvendi.app", false},
-                      RootCase{"/tmp/root", "System/Library/Input Methods/Sorvendi.app", false},
-                      RootCase{std::nullopt, "/System/Library/Input Methods/Sorvendi.app", true},
-                      RootCase{"", "//System/Library/Input Methods/Sorvendi.app", true}));
 
 }  // namespace
 }  // namespace lumeris

@@ -1,9 +1,9 @@
+// The user's languages and country from the POSIX locale variables.
 #include "platform/preferred_languages.h"
 
 #include <gtest/gtest.h>
 
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -15,99 +15,72 @@ namespace {
 using testing::ScopedEnv;
 using Maybe = std::optional<std::string>;
 
-struct TagCase {
-  const char* posix;
-  Maybe tag;
-  friend void PrintTo(const TagCase& c, std::ostream* os) { *os << '"' << c.posix << '"'; }
-};
-
-class LanguageTagFromPosixLocaleTest : public ::testing::TestWithParam<TagCase> {};
-
-TEST_P(LanguageTagFromPosixLocaleTest, ConvertsToLanguageTag) {
-  EXPECT_EQ(LanguageTagFromPosixLocale(GetParam().posix), GetParam().tag) << GetParam().posix;
+TEST(LanguageTagFromPosixLocaleTest, ConvertsToLanguageTagOrNothing) {
+  const std::pair<const char*, Maybe> cases[] = {
+      {"de_DE.UTF-8", "de-DE"}, {"en_US.ISO-8859-1", "en-US"}, {"pt_BR", "pt-BR"}, {"fr", "fr"},
+      {"de_de.utf8", "de-DE"}, {"sr_RS@latin", "sr-Latn-RS"}, {"sr_RS.UTF-8@cyrillic", "sr-Cyrl-RS"},
+      {"ca_ES@valencia", "ca-ES-valencia"}, {"de_DE@euro", "de-DE"}, {"es_419", "es-419"},
+      {"zh-Hant-TW", "zh-Hant-TW"},
+      {"C", std::nullopt}, {"POSIX", std::nullopt}, {"C.UTF-8", std::nullopt}, {"", std::nullopt},
+      {".UTF-8", std::nullopt}, {"x", std::nullopt}, {"12_34", std::nullopt}, {"en_US_bad!", std::nullopt}};
+  for (const auto& [posix, tag] : cases) EXPECT_EQ(LanguageTagFromPosixLocale(posix), tag) << '"' << posix << '"';
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    PosixNames, LanguageTagFromPosixLocaleTest,
-    ::testing::Values(TagCase{"de_DE.UTF-8", "de-DE"}, TagCase{"en_US.ISO-8859-1", "en-US"},
-                      TagCase{"pt_BR", "pt-BR"}, TagCase{"fr", "fr"}, TagCase{"de_de.utf8", "de-DE"},
-                      TagCase{"sr_RS@latin", "sr-Latn-RS"}, TagCase{"sr_RS.UTF-8@cyrillic", "sr-Cyrl-RS"},
-                      TagCase{"ca_ES@valencia", "ca-ES-valencia"}, TagCase{"de_DE@euro", "de-DE"},
-                      TagCase{"es_419", "es-419"}, TagCase{"zh-Hant-TW", "zh-Hant-TW"}));
-
-INSTANTIATE_TEST_SUITE_P(
-    NoLanguage, LanguageTagFromPosixLocaleTest,
-    ::testing::Values(TagCase{"C", std::nullopt}, TagCase{"POSIX", std::nullopt},
-                      TagCase{"C.UTF-8", std::nullopt}, TagCase{"", std::nullopt},
-                      TagCase{".UTF-8", std::nullopt}, TagCase{"x", std::nullopt},
-                      TagCase{"12_34", std::nullopt}, TagCase{"en_US_bad!", std::nullopt}));
 
 // The four variables, in the order LANGUAGE, LC_ALL, LC_MESSAGES, LANG.
 struct Environment {
   Maybe language, lc_all, lc_messages, lang;
+  void ApplyTo(ScopedEnv& env) const {
+    env.Set("LANGUAGE", language);
+    env.Set("LC_ALL", lc_all);
+    env.Set("LC_MESSAGES", lc_messages);
+    env.Set("LANG", lang);
+  }
 };
+constexpr std::nullopt_t none = std::nullopt;
 
-void Apply(ScopedEnv& env, const Environment& e) {
-  env.Set("LANGUAGE", e.language);
-  env.Set("LC_ALL", e.lc_all);
-  env.Set("LC_MESSAGES", e.lc_messages);
-  env.Set("LANG", e.lang);
+TEST(PreferredLanguagesTest, ReadsTheEnvironment) {
+  const struct {
+    const char* what;
+    Environment environment;
+    std::vector<std::string> languages;
+  } cases[] = {
+      {"LANGUAGE list wins, duplicates dropped", {"de_CH:fr:de_CH", none, none, "en_US.UTF-8"}, {"de-CH", "fr"}},
+      {"unusable LANGUAGE entries are skipped", {"C::sv_SE", none, none, "en_US"}, {"sv-SE"}},
+      {"LANGUAGE with nothing usable falls back", {"C", none, none, "fr_FR"}, {"fr-FR"}},
+      {"empty LANGUAGE falls back", {"", none, none, "fr_FR"}, {"fr-FR"}},
+      {"LC_ALL before LC_MESSAGES and LANG", {none, "ja_JP.UTF-8", "ko_KR", "en_US"}, {"ja-JP"}},
+      {"LC_MESSAGES before LANG", {none, none, "ko_KR", "en_US"}, {"ko-KR"}},
+      {"empty LC_ALL does not count", {none, "", none, "it_IT"}, {"it-IT"}},
+      {"LC_ALL=C means none", {none, "C", none, "de_DE"}, {}},
+      {"nothing set", {none, none, none, none}, {}},
+  };
+  for (const auto& c : cases) {
+    ScopedEnv env;
+    c.environment.ApplyTo(env);
+    EXPECT_EQ(PreferredLanguages(), c.languages) << c.what;
+  }
 }
 
-struct LanguagesCase {
-  const char* what;
-  Environment environment;
-  std::vector<std::string> languages;
-  friend void PrintTo(const LanguagesCase& c, std::ostream* os) { *os << c.what; }
-};
-
-class PreferredLanguagesTest : public ::testing::TestWithParam<LanguagesCase> {};
-
-TEST_P(PreferredLanguagesTest, ReadsTheEnvironment) {
-  ScopedEnv env;
-  Apply(env, GetParam().environment);
-  EXPECT_EQ(PreferredLanguages(), GetParam().languages) << GetParam().what;
+TEST(CurrentLocaleCountryCodeTest, ReadsTheLocale) {
+  const struct {
+    const char* what;
+    Environment environment;
+    Maybe country;
+  } cases[] = {
+      {"LANG", {none, none, none, "de_CH.UTF-8"}, "CH"},
+      {"LC_ALL first", {none, "es_419", none, "en_US"}, "419"},
+      {"LC_MESSAGES before LANG", {none, none, "pt_BR", "en_US"}, "BR"},
+      {"script modifier keeps the region", {none, none, none, "sr_RS@latin"}, "RS"},
+      {"language without region", {none, none, none, "de"}, none},
+      {"LANGUAGE is not a locale", {"fr_FR", none, none, none}, none},
+      {"C locale", {none, "C", none, "de_DE"}, none},
+  };
+  for (const auto& c : cases) {
+    ScopedEnv env;
+    c.environment.ApplyTo(env);
+    EXPECT_EQ(CurrentLocaleCountryCode(), c.country) << c.what;
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Sources, PreferredLanguagesTest,
-    ::testing::Values(
-        LanguagesCase{"LANGUAGE list wins, duplicates dropped",
-                      {"de_CH:fr:de_CH", std::nullopt, std::nullopt, "en_US.UTF-8"}, {"de-CH", "fr"}},
-        LanguagesCase{"unusable LANGUAGE entries are skipped", {"C::sv_SE", std::nullopt, std::nullopt, "en_US"}, {"sv-SE"}},
-        LanguagesCase{"LANGUAGE with nothing usable falls back", {"C", std::nullopt, std::nullopt, "fr_FR"}, {"fr-FR"}},
-        LanguagesCase{"empty LANGUAGE falls back", {"", std::nullopt, std::nullopt, "fr_FR"}, {"fr-FR"}},
-        LanguagesCase{"LC_ALL before LC_MESSAGES and LANG", {std::nullopt, "ja_JP.UTF-8", "ko_KR", "en_US"}, {"ja-JP"}},
-        LanguagesCase{"LC_MESSAGES before LANG", {std::nullopt, std::nullopt, "ko_KR", "en_US"}, {"ko-KR"}},
-        LanguagesCase{"empty LC_ALL does not count", {std::nullopt, "", std::nullopt, "it_IT"}, {"it-IT"}},
-        LanguagesCase{"LC_ALL=C means none", {std::nullopt, "C", std::nullopt, "de_DE"}, {}},
-        LanguagesCase{"nothing set", {std::nullopt, std::nullopt, std::nullopt, std::nullopt}, {}}));
-
-struct CountryCase {
-  const char* what;
-  Environment environment;
-  Maybe country;
-  friend void PrintTo(const CountryCase& c, std::ostream* os) { *os << c.what; }
-};
-
-class CurrentLocaleCountryCodeTest : public ::testing::TestWithParam<CountryCase> {};
-
-TEST_P(CurrentLocaleCountryCodeTest, ReadsTheLocale) {
-  ScopedEnv env;
-  Apply(env, GetParam().environment);
-  EXPECT_EQ(CurrentLocaleCountryCode(), GetParam().country) << GetParam().what;
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Sources, CurrentLocaleCountryCodeTest,
-    ::testing::Values(
-        CountryCase{"LANG", {std::nullopt, std::nullopt, std::nullopt, "de_CH.UTF-8"}, "CH"},
-        CountryCase{"LC_ALL first", {std::nullopt, "es_419", std::nullopt, "en_US"}, "419"},
-        CountryCase{"LC_MESSAGES before LANG", {std::nullopt, std::nullopt, "pt_BR", "en_US"}, "BR"},
-        CountryCase{"script modifier keeps the region", {std::nullopt, std::nullopt, std::nullopt, "sr_RS@latin"}, "RS"},
-        CountryCase{"language without region", {std::nullopt, std::nullopt, std::nullopt, "de"}, std::nullopt},
-        CountryCase{"LANGUAGE is not a locale", {"fr_FR", std::nullopt, std::nullopt, std::nullopt}, std::nullopt},
-        CountryCase{"C locale", {std::nullopt, "C", std::nullopt, "de_DE"}, std::nullopt}));
 
 }  // namespace
 }  // namespace lumeris

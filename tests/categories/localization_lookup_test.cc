@@ -1,3 +1,5 @@
+// The category localization lookup: the one-entry strings-table cache (watched through a loader
+// that counts loads), where answers come from, the choice of localization, and the system bundles.
 #include "categories/localization_lookup.h"
 
 #include <gtest/gtest.h>
@@ -12,6 +14,8 @@
 #include <vector>
 
 #include "bundle/bundle_fixture.h"
+#include "categories/system_bundles.h"
+#include "platform/system_root.h"
 #include "support/scoped_env.h"
 #include "support/temp_dir.h"
 
@@ -22,254 +26,225 @@ namespace fs = std::filesystem;
 using testing::BundleWriter;
 using testing::ScopedEnv;
 using testing::ScopedTempDir;
+using Maybe = std::optional<std::string_view>;
 
-// The translation a fixture table holds for `key`: it names where it came from, so every
-// answer shows which table of which localization was read.
-std::string Translation(std::string_view localization, std::string_view table, std::string_view key) {
-  return std::string(localization) + "/" + std::string(table) + "/" + std::string(key);
+// A fixture table's translation names its bundle, localization and table, so every answer shows
+// which file was read.
+std::string Translation(std::string_view bundle, std::string_view loc, std::string_view table,
+                        std::string_view key) {
+  return std::string(bundle) + ":" + std::string(loc) + "/" + std::string(table) + "/" +
+         std::string(key);
 }
 
-// Wraps the real loader and counts how often each table file is loaded.
-class CountingLoader {
- public:
-  StringsTableCache::Loader loader() {
-    return [this](const fs::path& path) -> StringsTableCache::Table {
-      {
-        std::lock_guard lock(mutex_);
-        ++loads_[path];
-      }
-      auto table = ReadStringsTable(path);
-      return table ? std::make_shared<const plist::Dictionary>(std::move(*table)) : nullptr;
-    };
-  }
-  int loads(const fs::path& path) {
-    std::lock_guard lock(mutex_);
-    return loads_[path];
-  }
-  int total() {
-    std::lock_guard lock(mutex_);
-    int sum = 0;
-    for (const auto& [path, count] : loads_) sum += count;
-    return sum;
-  }
-
- private:
-  std::mutex mutex_;
-  std::map<fs::path, int> loads_;
-};
-
-// An application bundle with "Localizable" and "Emoji_Category" tables in en, de and fr, each
-// holding the keys "Smileys" and "Animals", plus a key "OnlyInLocalizable" in every
-// "Localizable" table. The user's language is French unless a test says otherwise.
+// Bundles "app" and "same" (one identifier), "other" and "anon" (no identifier), each with
+// "Localizable" and "Emoji_Category" in en, de and fr holding "Smileys" and "Animals" (and
+// "OnlyInLocalizable" in "Localizable"). The user's language is French. The loader counts loads
+// per file, named like a translation: "app:de/Emoji_Category".
 class LocalizationLookupTest : public ::testing::Test {
  protected:
-  static constexpr const char* kIdentifier = "com.example.Picker";
-
-  LocalizationLookupTest() : app_(WriteApp("Picker.app", kIdentifier)), cache_(counter_.loader()) {
+  LocalizationLookupTest()
+      : cache_([this](const fs::path& path) -> StringsTableCache::Table {
+          const std::string bundle = path.parent_path().parent_path().parent_path().parent_path().filename();
+          std::lock_guard lock(mutex_);
+          ++loads_[bundle + ":" + path.parent_path().stem().string() + "/" + path.stem().string()];
+          auto table = ReadStringsTable(path);
+          return table ? std::make_shared<const plist::Dictionary>(std::move(*table)) : nullptr;
+        }) {
     testing::SetUserLanguages(env_, "fr");
-  }
-
-  BundleWriter WriteApp(std::string_view name, std::string_view identifier) {
-    BundleWriter app = BundleWriter::Application(dir_.path() / name, std::string(identifier), "en");
-    for (const char* loc : {"en", "de", "fr"}) {
-      for (const char* table : {"Localizable", "Emoji_Category"}) {
-        std::map<std::string, std::string> strings;
-        for (const char* key : {"Smileys", "Animals"}) strings[key] = Translation(loc, table, key);
-        if (std::string_view(table) == "Localizable") strings["OnlyInLocalizable"] = Translation(loc, table, "OnlyInLocalizable");
-        app.WriteStringsTable(loc, table, strings);
+    for (const std::string name : {"app", "other", "anon"}) {
+      BundleWriter app = BundleWriter::Application(dir_.path() / name, "com.example." + name, "en");
+      for (const char* loc : {"en", "de", "fr"}) {
+        for (const std::string table : {"Localizable", "Emoji_Category"}) {
+          std::map<std::string, std::string> strings;
+          for (const char* key : {"Smileys", "Animals", "OnlyInLocalizable"}) {
+            if (table == "Localizable" || key[0] != 'O') strings[key] = Translation(name, loc, table, key);
+          }
+          app.WriteStringsTable(loc, table, strings);
+        }
       }
+      if (name == "anon") BundleWriter::WritePlist(app.info_file(), plist::Dictionary{});
+      bundles_.emplace(name, *Bundle::Open(app.path()));
     }
-    return app;
+    bundles_.emplace("same", *Bundle::Open(dir_.path() / "app"));
   }
-
-  Bundle Open(const BundleWriter& writer) const { return *Bundle::Open(writer.path()); }
 
   fs::path TableFile(std::string_view loc, std::string_view table) const {
-    return app_.Folder(loc) / (std::string(table) + ".strings");
+    return dir_.path() / "app/Contents/Resources" / (std::string(loc) + ".lproj") /
+           (std::string(table) + ".strings");
   }
-
-  // One lookup through the test's own cache.
-  std::optional<std::string> Lookup(std::string_view key, const Bundle& bundle, std::optional<std::string_view> loc,
-                                    std::optional<std::string_view> table, std::optional<std::string_view> fallback = "default") {
-    return cache_.Lookup(key, &bundle, loc, table, fallback);
+  std::map<std::string, int> Loads() {
+    std::lock_guard lock(mutex_);
+    return loads_;
+  }
+  std::optional<std::string> Lookup(std::string_view key, Maybe loc, Maybe table,
+                                    Maybe fallback = "default", const char* bundle = "app") {
+    return cache_.Lookup(key, &bundles_.at(bundle), loc, table, fallback);
   }
 
   ScopedTempDir dir_;
   ScopedEnv env_;
-  BundleWriter app_;
-  CountingLoader counter_;
+  std::map<std::string, Bundle> bundles_;
+  std::mutex mutex_;
+  std::map<std::string, int> loads_;
   StringsTableCache cache_;
 };
 
-// Hit and miss rules of the one-entry cache.
+constexpr Maybe kEmoji = "Emoji_Category";
+constexpr Maybe kDefault = std::nullopt;
 
-TEST_F(LocalizationLookupTest, NamedTableLoadsOnceForConsecutiveLookups) {
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Emoji_Category"), Translation("de", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Animals", app, "de", "Emoji_Category"), Translation("de", "Emoji_Category", "Animals"));
-  EXPECT_EQ(counter_.loads(TableFile("de", "Emoji_Category")), 1);
-  EXPECT_EQ(counter_.total(), 1);
+// Hit and miss rules of the one-entry cache: a run of lookups of "Smileys", each answered from
+// the right file, and every load the run made.
+struct Step {
+  const char* bundle;
+  Maybe loc;
+  Maybe table;
+};
+struct CacheCase {
+  const char* what;
+  std::vector<Step> steps;
+  std::map<std::string, int> loads;
+  friend void PrintTo(const CacheCase& c, std::ostream* os) { *os << c.what; }
+};
+
+class CacheRuleTest : public LocalizationLookupTest, public ::testing::WithParamInterface<CacheCase> {};
+
+TEST_P(CacheRuleTest, LoadsOnlyOnAMiss) {
+  for (const Step& s : GetParam().steps) {
+    const char* bundle = std::string_view(s.bundle) == "same" ? "app" : s.bundle;
+    const std::string_view loc = !s.loc ? "fr" : *s.loc == "English" ? "en" : *s.loc;
+    EXPECT_EQ(Lookup("Smileys", s.loc, s.table, "default", s.bundle),
+              Translation(bundle, loc, s.table.value_or("Localizable"), "Smileys"));
+  }
+  EXPECT_EQ(Loads(), GetParam().loads);
 }
 
-TEST_F(LocalizationLookupTest, DefaultTableReloadsEveryTime) {
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "de", std::nullopt), Translation("de", "Localizable", "Smileys"));
-  EXPECT_EQ(Lookup("Animals", app, "de", std::nullopt), Translation("de", "Localizable", "Animals"));
-  EXPECT_EQ(counter_.loads(TableFile("de", "Localizable")), 2);
-}
+INSTANTIATE_TEST_SUITE_P(
+    Rules, CacheRuleTest,
+    ::testing::Values(
+        CacheCase{"two lookups in one named table load it once",
+                  {{"app", "de", kEmoji}, {"app", "de", kEmoji}}, {{"app:de/Emoji_Category", 1}}},
+        CacheCase{"the default table reloads every time",
+                  {{"app", "de", kDefault}, {"app", "de", kDefault}}, {{"app:de/Localizable", 2}}},
+        CacheCase{"a new localization replaces the entry",
+                  {{"app", "de", kEmoji}, {"app", "de", kEmoji}, {"app", "fr", kEmoji}, {"app", "de", kEmoji}},
+                  {{"app:de/Emoji_Category", 2}, {"app:fr/Emoji_Category", 1}}},
+        CacheCase{"a new table name replaces the entry",
+                  {{"app", "de", kEmoji}, {"app", "de", "Localizable"}, {"app", "de", kEmoji}},
+                  {{"app:de/Emoji_Category", 2}, {"app:de/Localizable", 1}}},
+        CacheCase{"bundles are told apart by identifier",
+                  {{"app", "de", kEmoji}, {"same", "de", kEmoji}, {"other", "de", kEmoji}},
+                  {{"app:de/Emoji_Category", 1}, {"other:de/Emoji_Category", 1}}},
+        CacheCase{"an absent localization never hits",
+                  {{"app", std::nullopt, kEmoji}, {"app", std::nullopt, kEmoji}}, {{"app:fr/Emoji_Category", 2}}},
+        CacheCase{"a bundle without identifier never hits",
+                  {{"anon", "de", kEmoji}, {"anon", "de", kEmoji}}, {{"anon:de/Emoji_Category", 2}}},
+        CacheCase{"\"English\" reads the en tables",
+                  {{"app", "English", kEmoji}, {"app", "English", kDefault}},
+                  {{"app:en/Emoji_Category", 1}, {"app:en/Localizable", 1}}}));
 
-TEST_F(LocalizationLookupTest, NewLocalizationReplacesTheEntry) {
-  const Bundle app = Open(app_);
-  Lookup("Smileys", app, "de", "Emoji_Category");
-  Lookup("Smileys", app, "de", "Emoji_Category");
-  EXPECT_EQ(Lookup("Smileys", app, "fr", "Emoji_Category"), Translation("fr", "Emoji_Category", "Smileys"));
-  // The German entry is gone: going back loads it again.
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Emoji_Category"), Translation("de", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(counter_.loads(TableFile("de", "Emoji_Category")), 2);
-  EXPECT_EQ(counter_.loads(TableFile("fr", "Emoji_Category")), 1);
-}
-
-TEST_F(LocalizationLookupTest, NewTableNameReplacesTheEntry) {
-  const Bundle app = Open(app_);
-  Lookup("Smileys", app, "de", "Emoji_Category");
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Localizable"), Translation("de", "Localizable", "Smileys"));
-  Lookup("Smileys", app, "de", "Emoji_Category");
-  EXPECT_EQ(counter_.loads(TableFile("de", "Emoji_Category")), 2);
-}
-
-TEST_F(LocalizationLookupTest, BundlesAreToldApartByIdentifier) {
-  const Bundle app = Open(app_);
-  const Bundle same_identifier = Open(app_);
-  const BundleWriter other_writer = WriteApp("Other.app", "com.example.Other");
-  const Bundle other = Open(other_writer);
-
-  Lookup("Smileys", app, "de", "Emoji_Category");
-  Lookup("Smileys", same_identifier, "de", "Emoji_Category");
-  EXPECT_EQ(counter_.total(), 1);
-  EXPECT_EQ(Lookup("Smileys", other, "de", "Emoji_Category"), Translation("de", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(counter_.loads(other_writer.Folder("de") / "Emoji_Category.strings"), 1);
-}
-
-TEST_F(LocalizationLookupTest, AbsentLocalizationOrIdentifierNeverHits) {
-  const Bundle app = Open(app_);
-  Lookup("Smileys", app, std::nullopt, "Emoji_Category");
-  EXPECT_EQ(Lookup("Smileys", app, std::nullopt, "Emoji_Category"), Translation("fr", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(counter_.loads(TableFile("fr", "Emoji_Category")), 2);
-
-  const BundleWriter anonymous_writer = WriteApp("Anonymous.app", "unused");
-  BundleWriter::WritePlist(anonymous_writer.info_file(), plist::Dictionary{{"CFBundleDevelopmentRegion", "en"}});
-  const Bundle anonymous = Open(anonymous_writer);
-  Lookup("Smileys", anonymous, "de", "Emoji_Category");
-  Lookup("Smileys", anonymous, "de", "Emoji_Category");
-  EXPECT_EQ(counter_.loads(anonymous_writer.Folder("de") / "Emoji_Category.strings"), 2);
-}
-
-// Where the answer comes from.
-
-TEST_F(LocalizationLookupTest, EnglishResolvesToEnTables) {
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "English", "Emoji_Category"), Translation("en", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Smileys", app, "English", std::nullopt), Translation("en", "Localizable", "Smileys"));
-}
+// Where the answer comes from when the loaded table cannot give it.
 
 TEST_F(LocalizationLookupTest, KeyMissingFromLoadedTableGivesTheDefault) {
-  const Bundle app = Open(app_);
-  // "OnlyInLocalizable" is in every Localizable table, and the user's own language (fr) has it too.
-  EXPECT_EQ(Lookup("OnlyInLocalizable", app, "de", "Emoji_Category", "fallback"), "fallback");
-  EXPECT_EQ(Lookup("OnlyInLocalizable", app, "de", "Emoji_Category", std::nullopt), std::nullopt);
+  // "OnlyInLocalizable" is in every Localizable table, and in the user's own language (fr) too.
+  EXPECT_EQ(Lookup("OnlyInLocalizable", "de", kEmoji, "fallback"), "fallback");
+  EXPECT_EQ(Lookup("OnlyInLocalizable", "de", kEmoji, std::nullopt), std::nullopt);
+  BundleWriter::WritePlist(TableFile("fr", "Emoji_Category"), plist::Dictionary{{"Smileys", 42}});
+  EXPECT_EQ(Lookup("Smileys", "fr", kEmoji, "fallback"), "fallback") << "a wrong-typed value";
 }
 
-TEST_F(LocalizationLookupTest, WrongTypedValueGivesTheDefault) {
-  app_.WriteStringsTable("de", "Emoji_Category", {});
-  BundleWriter::WritePlist(TableFile("de", "Emoji_Category"), plist::Dictionary{{"Smileys", 42}});
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Emoji_Category", "fallback"), "fallback");
-}
-
-TEST_F(LocalizationLookupTest, MissingTableAsksTheBundleInTheUsersLanguage) {
+TEST_F(LocalizationLookupTest, MissingOrUnreadableTableAsksTheBundleInTheUsersLanguage) {
   fs::remove(TableFile("de", "Emoji_Category"));
-  const Bundle app = Open(app_);
-  // The bundle's own lookup follows the user's language (fr), not the localization asked for.
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Emoji_Category"), Translation("fr", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Unknown", app, "de", "Emoji_Category", "fallback"), "fallback");
-  EXPECT_EQ(counter_.total(), 0);
-}
+  EXPECT_EQ(Lookup("Smileys", "de", kEmoji), Translation("app", "fr", "Emoji_Category", "Smileys"));
+  EXPECT_EQ(Lookup("Unknown", "de", kEmoji, "fallback"), "fallback");
+  EXPECT_EQ(Lookup("Smileys", "de", "NoSuchTable", "fallback"), "fallback");
 
-TEST_F(LocalizationLookupTest, UnreadableTableIsCachedAsMissing) {
-  BundleWriter::WriteFile(TableFile("de", "Emoji_Category"), "not a property list");
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "de", "Emoji_Category"), Translation("fr", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Animals", app, "de", "Emoji_Category"), Translation("fr", "Emoji_Category", "Animals"));
-  EXPECT_EQ(counter_.loads(TableFile("de", "Emoji_Category")), 1);
-}
+  // An unreadable table is cached as missing: loaded once for two lookups.
+  BundleWriter::WriteFile(TableFile("en", "Emoji_Category"), "not a property list");
+  EXPECT_EQ(Lookup("Smileys", "en", kEmoji), Translation("app", "fr", "Emoji_Category", "Smileys"));
+  EXPECT_EQ(Lookup("Animals", "en", kEmoji), Translation("app", "fr", "Emoji_Category", "Animals"));
+  EXPECT_EQ(Loads()["app:en/Emoji_Category"], 1);
 
-TEST_F(LocalizationLookupTest, NoTableAnywhereGivesTheDefault) {
-  const Bundle app = Open(app_);
-  EXPECT_EQ(Lookup("Smileys", app, "de", "NoSuchTable", "fallback"), "fallback");
-  EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", "Emoji_Category", "fallback"), "fallback");
-  EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", "Emoji_Category", std::nullopt), std::nullopt);
+  EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", kEmoji, "fallback"), "fallback");
+  EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", kEmoji, std::nullopt), std::nullopt);
 }
 
 TEST_F(LocalizationLookupTest, ConcurrentLookupsAlwaysReadTheirOwnTable) {
-  const Bundle app = Open(app_);
   std::atomic<int> wrong{0};
   std::vector<std::thread> threads;
-  const std::vector<std::pair<const char*, std::optional<const char*>>> requests = {
-      {"de", "Emoji_Category"}, {"fr", "Emoji_Category"}, {"en", std::nullopt}, {"de", "Localizable"}};
-  for (const auto& [loc, table] : requests) {
+  for (const auto& [loc, table] : std::vector<std::pair<const char*, Maybe>>{
+           {"de", kEmoji}, {"fr", kEmoji}, {"en", kDefault}, {"de", "Localizable"}}) {
     threads.emplace_back([&, loc, table] {
-      const std::optional<std::string_view> table_name = table ? std::optional<std::string_view>(*table) : std::nullopt;
-      const std::string expected = Translation(loc, table.value_or("Localizable"), "Animals");
-      for (int i = 0; i < 300; ++i) {
-        if (cache_.Lookup("Animals", &app, loc, table_name, "default") != expected) ++wrong;
-      }
+      const std::string expected = Translation("app", loc, table.value_or("Localizable"), "Animals");
+      for (int i = 0; i < 300; ++i) wrong += Lookup("Animals", loc, table) != expected;
     });
   }
   for (std::thread& thread : threads) thread.join();
   EXPECT_EQ(wrong.load(), 0);
 }
 
-// The process-wide lookup and the choice of localization.
-
 TEST_F(LocalizationLookupTest, ProcessWideLookupReadsRealFiles) {
-  const Bundle app = Open(app_);
-  EXPECT_EQ(LocalizedStringForLanguage("Animals", &app, "de", "Emoji_Category", "default"),
-            Translation("de", "Emoji_Category", "Animals"));
-  EXPECT_EQ(LocalizedStringForLanguage("Nope", &app, "English", std::nullopt, "default"), "default");
+  const Bundle& app = bundles_.at("app");
+  EXPECT_EQ(LocalizedStringForLanguage("Animals", &app, "de", kEmoji, "default"),
+            Translation("app", "de", "Emoji_Category", "Animals"));
+  EXPECT_EQ(LocalizedStringForLanguage("Nope", &app, "English", kDefault, "default"), "default");
 }
 
-struct PreferenceCase {
-  const char* what;
-  std::vector<std::string> localizations;
-  std::optional<std::string> languages;  // LANGUAGE
-  std::string expected;
-  friend void PrintTo(const PreferenceCase& c, std::ostream* os) { *os << c.what; }
-};
-
-class PreferredLocalizationOfBundleTest : public ::testing::TestWithParam<PreferenceCase> {};
-
-TEST_P(PreferredLocalizationOfBundleTest, ChoosesAmongTheBundlesLocalizations) {
-  ScopedTempDir dir;
-  ScopedEnv env;
-  testing::SetUserLanguages(env, GetParam().languages);
-  const BundleWriter app = BundleWriter::Application(dir.path() / "A.app", "com.example.A", "de");
-  for (const std::string& loc : GetParam().localizations) app.Folder(loc);
-  const Bundle bundle = *Bundle::Open(app.path());
-  EXPECT_EQ(PreferredLocalizationOfBundle(&bundle), GetParam().expected);
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Choice, PreferredLocalizationOfBundleTest,
-    ::testing::Values(
-        PreferenceCase{"first language that matches", {"en", "de", "fr"}, "it:fr_CA:de", "fr"},
-        PreferenceCase{"regional variant", {"en", "pt", "pt-PT"}, "pt_PT.UTF-8", "pt-PT"},
-        PreferenceCase{"old-style folder", {"German", "French"}, "de_DE", "German"},
-        PreferenceCase{"no match is English, not the development localization", {"de", "fr"}, "ja", "English"},
-        PreferenceCase{"no languages at all", {"de", "fr"}, std::nullopt, "English"},
-        PreferenceCase{"no localizations", {}, "de", "English"}));
-
-TEST(PreferredLocalizationOfBundleErrorTest, NoBundleIsEnglish) {
+TEST(PreferredLocalizationOfBundleTest, ChoosesAmongTheBundlesLocalizationsElseEnglish) {
+  const struct {
+    const char* what;
+    std::vector<std::string> localizations;
+    std::optional<std::string> languages;  // LANGUAGE
+    const char* expected;
+  } cases[] = {
+      {"first language that matches", {"en", "de", "fr"}, "it:fr_CA:de", "fr"},
+      {"regional variant", {"en", "pt", "pt-PT"}, "pt_PT.UTF-8", "pt-PT"},
+      {"old-style folder", {"German", "French"}, "de_DE", "German"},
+      {"no match is English, not the development localization", {"de", "fr"}, "ja", "English"},
+      {"no languages at all", {"de", "fr"}, std::nullopt, "English"},
+      {"no localizations", {}, "de", "English"},
+  };
+  for (const auto& c : cases) {
+    ScopedTempDir dir;
+    ScopedEnv env;
+    testing::SetUserLanguages(env, c.languages);
+    const BundleWriter app = BundleWriter::Application(dir.path() / "A.app", "com.example.A", "de");
+    for (const std::string& loc : c.localizations) app.Folder(loc);
+    const Bundle bundle = *Bundle::Open(app.path());
+    EXPECT_EQ(PreferredLocalizationOfBundle(&bundle), c.expected) << c.what;
+  }
   EXPECT_EQ(PreferredLocalizationOfBundle(nullptr), "English");
+}
+
+// The system bundles under LUMERIS_SYSTEM_ROOT. The framework bundle is process-wide, so its whole
+// life is one test: absent, found, kept when the root later changes.
+TEST(SystemBundlesTest, OpenUnderTheSystemRootAndTheFrameworkIsKept) {
+  ScopedTempDir root;
+  ScopedEnv env;
+  env.Set("LUMERIS_SYSTEM_ROOT", root.path().string());
+  testing::SetUserLanguages(env, "de");
+
+  EXPECT_FALSE(OpenApplicationBundle());
+  BundleWriter::Application(SystemPath(kApplicationBundlePath), "com.vantorel.SorvendiIM", "en");
+  const auto app = OpenApplicationBundle();
+  ASSERT_TRUE(app);
+  EXPECT_EQ(app->identifier(), "com.vantorel.SorvendiIM");
+  EXPECT_EQ(app->path(), root.path() / "System/Library/Input Methods/Sorvendi.app");
+
+  EXPECT_EQ(MyFrameworkBundle(), nullptr);
+  EXPECT_EQ(MyFrameworkLocalizedString("Close"), "Close");
+  BundleWriter framework = BundleWriter::Framework(SystemPath(kFrameworkBundlePath), "com.vantorel.Lumeris", "en");
+  framework.WriteStringsTable("en", "Localizable", {{"Close", "Close"}, {"Done", "Done"}});
+  framework.WriteStringsTable("de", "Localizable", {{"Close", "Schließen"}});
+  const Bundle* found = MyFrameworkBundle();
+  ASSERT_NE(found, nullptr);
+  EXPECT_EQ(found->identifier(), "com.vantorel.Lumeris");
+  EXPECT_EQ(MyFrameworkLocalizedString("Close"), "Schließen");
+  EXPECT_EQ(MyFrameworkLocalizedString("Done"), "Done");
+  EXPECT_EQ(MyFrameworkLocalizedString("Missing"), "Missing");
+
+  ScopedTempDir elsewhere;
+  env.Set("LUMERIS_SYSTEM_ROOT", elsewhere.path().string());
+  EXPECT_EQ(MyFrameworkBundle(), found);
 }
 
 }  // namespace

@@ -6,156 +6,106 @@
 #include <vector>
 
 #include "client/cli_items.h"
+#include "client/cli_json_value.h"
 #include "client/cli_output.h"
 
 namespace lumeris::cli {
 namespace {
 
-MessageValue Strings(std::vector<std::string> strings) {
-  MessageValue array = MessageValue::MakeArray();
-  for (std::string& text : strings) array.Append(MessageValue::String(std::move(text)));
-  return array;
-}
-
-struct ItemCase {
-  const char* item;
-  ItemOptions options;
-  const char* entity_id;
-};
+// A reply value written as JSON (with the "$data" and other escapes).
+MessageValue Json(const char* text) { return MessageValueFromJsonText(text, nullptr).value_or(MessageValue()); }
 
 TEST(EntityIDForItemTest, TurnsCharactersIntoCurrentFormIDsAndKeepsIDs) {
-  const ItemCase cases[] = {
+  const struct {
+    const char* item;
+    ItemOptions options;
+    const char* entity_id;
+  } cases[] = {
       {"A", {}, R"(com.vantorel.lmk:{"char":"A"})"},
       {"😀", {.emoji_font = true}, R"(com.vantorel.lmk:{"char":"😀","font":"VantorelColorEmoji"})"},
       // A text font without a glyph is not recorded; with a glyph it is.
       {"A", {.font = "DejaVu Sans"}, R"(com.vantorel.lmk:{"char":"A"})"},
       {"A", {.font = "F", .glyph = 7}, R"(com.vantorel.lmk:{"char":"A","font":"F","glyph":7})"},
-      {"A", {.emoji_font = true, .font = "F", .glyph = 7},
-       R"(com.vantorel.lmk:{"char":"A","font":"F","glyph":7})"},
+      {"A", {.emoji_font = true, .font = "F", .glyph = 7}, R"(com.vantorel.lmk:{"char":"A","font":"F","glyph":7})"},
       {R"(com.vantorel.lmk:{"char":"B"})", {.emoji_font = true}, R"(com.vantorel.lmk:{"char":"B"})"},
       {"com.vantorel.Lumeris:<font>F<string>C", {}, "com.vantorel.Lumeris:<font>F<string>C"},
       {"com.vantorel.lmkX", {}, R"(com.vantorel.lmk:{"char":"com.vantorel.lmkX"})"},
   };
-  for (const ItemCase& c : cases) {
-    EXPECT_EQ(EntityIDForItem(c.item, c.options), c.entity_id) << c.item;
-  }
+  for (const auto& c : cases) EXPECT_EQ(EntityIDForItem(c.item, c.options), c.entity_id) << c.item;
 }
 
 TEST(DescribeEntityIDTest, ReadsBothFormsAndMarksOpaqueStrings) {
-  ItemDescription current =
-      DescribeEntityID(R"(com.vantorel.lmk:{"char":"👍🏽","font":"VantorelColorEmoji"})");
+  const ItemDescription current = DescribeEntityID(R"(com.vantorel.lmk:{"char":"👍🏽","font":"VantorelColorEmoji"})");
   EXPECT_EQ(current.character, "👍🏽");
   EXPECT_EQ(current.font, "VantorelColorEmoji");
   EXPECT_FALSE(current.glyph);
   EXPECT_FALSE(current.opaque);
-
-  ItemDescription old = DescribeEntityID("com.vantorel.Lumeris:<font>F<glyph>12<string>Z");
+  const ItemDescription old = DescribeEntityID("com.vantorel.Lumeris:<font>F<glyph>12<string>Z");
   EXPECT_EQ(old.character, "Z");
   EXPECT_EQ(old.font, "F");
   EXPECT_EQ(old.glyph, 12u);
-
-  ItemDescription opaque = DescribeEntityID("some token");
+  const ItemDescription opaque = DescribeEntityID("some token");
   EXPECT_TRUE(opaque.opaque);
   EXPECT_EQ(opaque.character, "some token");
 }
 
 TEST(CodePointsTest, ListsScalarValues) {
   const std::pair<std::string, std::string> cases[] = {
-      {"", ""},
-      {"A", "U+0041"},
-      {"中", "U+4E2D"},
-      {"😀", "U+1F600"},
-      {"👍🏽", "U+1F44D U+1F3FD"},
-      {"a\xFF", "U+0061 U+FFFD"},
-  };
+      {"", ""}, {"A", "U+0041"}, {"中", "U+4E2D"}, {"😀", "U+1F600"},
+      {"👍🏽", "U+1F44D U+1F3FD"}, {"a\xFF", "U+0061 U+FFFD"}};
   for (const auto& [text, expected] : cases) EXPECT_EQ(CodePoints(text), expected) << text;
 }
 
-TEST(FormatCharactersTest, OneLinePerStringWithCodePoints) {
-  MessageValue result = Strings({"😀", "A"});
-  result.Append(MessageValue::Uint64(3));  // not a string: skipped
-  EXPECT_EQ(FormatCharacters(&result), "😀\tU+1F600\nA\tU+0041\n");
+TEST(FormatListsTest, CharactersAndItemsOneLineEach) {
+  const MessageValue characters = Json(R"(["😀", "A", 3])");  // not a string: skipped
+  EXPECT_EQ(FormatCharacters(&characters), "😀\tU+1F600\nA\tU+0041\n");
+  const MessageValue items = Json(R"([
+      "com.vantorel.lmk:{\"char\":\"😀\",\"font\":\"VantorelColorEmoji\"}",
+      "com.vantorel.Lumeris:<font>F<glyph>9<string>Z", "com.vantorel.lmk:{\"font\":\"F\"}", "opaque-token"])");
+  EXPECT_EQ(FormatItems(&items),
+            "😀\tU+1F600\tVantorelColorEmoji\nZ\tU+005A\tF\tglyph 9\n(no character)\t\tF\nopaque-token\t(opaque)\n");
   const MessageValue null;
   EXPECT_EQ(FormatCharacters(&null), "");
   EXPECT_EQ(FormatCharacters(nullptr), "");
+  EXPECT_EQ(FormatItems(&null), "");
 }
 
 TEST(FormatCharacterInfoTest, PrintsTheSixteenTagsInFieldOrderThenOtherKeys) {
   MessageValue record = MessageValue::MakeDictionary();
+  std::string expected = "中\tU+4E2D\n";
+  for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
+    // Field 3 is missing and prints empty.
+    expected += std::string(kCharacterInfoTags[i]) + "\t" + (i == 3 ? "" : "v" + std::to_string(i)) + "\n";
+  }
   // Set in reverse order so the output order cannot come from the dictionary.
   for (std::size_t i = kCharacterInfoTags.size(); i-- > 0;) {
-    if (i == 3) continue;  // a missing field prints empty
-    record.Set(std::string(kCharacterInfoTags[i]), MessageValue::String("v" + std::to_string(i)));
+    if (i != 3) record.Set(std::string(kCharacterInfoTags[i]), MessageValue::String("v" + std::to_string(i)));
   }
   record.Set("zzzz", MessageValue::String("extra"));
-  const std::string text = FormatCharacterInfo("中", &record);
-
-  std::vector<std::string> lines;
-  for (std::size_t start = 0; start < text.size();) {
-    const std::size_t end = text.find('\n', start);
-    lines.push_back(text.substr(start, end - start));
-    start = end + 1;
-  }
-  ASSERT_EQ(lines.size(), 18u) << text;
-  EXPECT_EQ(lines[0], "中\tU+4E2D");
-  for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
-    const std::string value = i == 3 ? "" : "v" + std::to_string(i);
-    EXPECT_EQ(lines[i + 1], std::string(kCharacterInfoTags[i]) + "\t" + value);
-  }
-  EXPECT_EQ(lines[17], "zzzz\textra");
-
+  EXPECT_EQ(FormatCharacterInfo("中", &record), expected + "zzzz\textra\n");
   const MessageValue empty = MessageValue::MakeDictionary();
   EXPECT_EQ(FormatCharacterInfo("中", &empty), "");
 }
 
-TEST(FormatItemsTest, PrintsCharactersFontsAndGlyphs) {
-  const MessageValue list = Strings({
-      R"(com.vantorel.lmk:{"char":"😀","font":"VantorelColorEmoji"})",
-      "com.vantorel.Lumeris:<font>F<glyph>9<string>Z",
-      R"(com.vantorel.lmk:{"font":"F"})",
-      "opaque-token",
-  });
-  EXPECT_EQ(FormatItems(&list),
-            "😀\tU+1F600\tVantorelColorEmoji\n"
-            "Z\tU+005A\tF\tglyph 9\n"
-            "(no character)\t\tF\n"
-            "opaque-token\t(opaque)\n");
-  const MessageValue null;
-  EXPECT_EQ(FormatItems(&null), "");
-}
-
-TEST(FormatCategoriesTest, OrdinaryAndEmojiEntries) {
-  MessageValue ordinary = MessageValue::MakeDictionary();
-  ordinary.Set("Data", MessageValue::String("←,→"));
-  ordinary.Set("TitleText", MessageValue::String("Arrows"));
-  ordinary.Set("TitleImage", MessageValue::Data({1, 2, 3}));
-  MessageValue sub = MessageValue::MakeDictionary();
-  sub.Set("TitleText", MessageValue::String("Smileys"));
-  sub.Set("Data", MessageValue::String("<emoji>😀"));
-  MessageValue emoji = MessageValue::MakeDictionary();
-  emoji.Set("Data", MessageValue::MakeArray({sub}));
-  emoji.Set("TitleText", MessageValue::String("Emoji"));
-  const MessageValue result = MessageValue::MakeArray({ordinary, emoji});
-
+TEST(FormatCategoriesTest, OrdinaryAndEmojiEntriesAndLongDataCut) {
+  const MessageValue result = Json(R"([
+      {"Data": "←,→", "TitleText": "Arrows", "TitleImage": {"$data": "AQID"}},
+      {"Data": [{"TitleText": "Smileys", "Data": "<emoji>😀"}], "TitleText": "Emoji"}])");
   EXPECT_EQ(FormatCategories({"Arrows", "Emoji"}, &result),
             "Arrows\tArrows\t(icon 3 bytes)\n  ←,→\nEmoji\tEmoji\n  Smileys\t<emoji>😀\n");
-}
 
-TEST(FormatCategoriesTest, LongDataIsCutAfterAPreview) {
   std::string data;
   for (int i = 0; i < 100; ++i) data += "é";
   MessageValue entry = MessageValue::MakeDictionary();
   entry.Set("Data", MessageValue::String(data));
-  const MessageValue result = MessageValue::MakeArray({entry});
-  const std::string text = FormatCategories({"Long"}, &result);
+  const MessageValue long_result = MessageValue::MakeArray({entry});
+  const std::string text = FormatCategories({"Long"}, &long_result);
   EXPECT_EQ(text.find(data), std::string::npos);
   EXPECT_NE(text.find(" ...\n"), std::string::npos) << text;
 }
 
 TEST(ReadAllOutputTest, HumanAndJsonFormsShowThePayloadsAsJson) {
-  MessageValue reply = MessageValue::MakeDictionary();
-  reply.Set("recents", Strings({R"(com.vantorel.lmk:{"char":"A"})"}));
-  reply.Set("favorites", MessageValue::Null());
+  MessageValue reply = Json(R"({"recents": ["com.vantorel.lmk:{\"char\":\"A\"}"], "favorites": null})");
   reply.Set("state", MessageValue::DataFromBytes(R"({"VTGlobalEmojiDiversityDescribed":true})"));
   EXPECT_EQ(FormatReadAll(reply),
             "recents:\nA\tU+0041\nfavorites: (none)\nskin tones: (none)\n"
@@ -165,7 +115,6 @@ TEST(ReadAllOutputTest, HumanAndJsonFormsShowThePayloadsAsJson) {
   EXPECT_EQ(json["state"]["VTGlobalEmojiDiversityDescribed"], true);
   EXPECT_TRUE(json["favorites"].is_null());
   EXPECT_FALSE(json.contains("skintones"));
-
   // A payload that is not JSON keeps its bytes, as a data escape.
   reply.Set("skintones", MessageValue::DataFromBytes("hi"));
   EXPECT_EQ(ReplyJson(reply)["skintones"], nlohmann::json({{"$data", "aGk="}}));
