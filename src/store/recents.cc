@@ -7,8 +7,7 @@
 #include "entity/recent_equality.h"
 #include "platform/preferences.h"
 #include "store/change_notification.h"
-#include "store/horse_racing.h"
-#include "store/legacy_lists.h"
+#include "store/id_list_read.h"
 #include "store/skin_tones.h"
 #include "store/storage_version.h"
 #include "store/store_keys.h"
@@ -32,24 +31,9 @@ bool HoldsSkinToneEmoji(const icu::UnicodeString& item) {
 
 std::optional<plist::Value> CopyRecentsIDArray(std::string_view identifier) {
   CheckDataStorageVersion();
-  const std::string key = StoreKey(kRecentsKeyPrefix, identifier);
-  CFPreferencesAppSynchronize(kStoreDomain);
-  std::optional<plist::Value> stored = CFPreferencesCopyAppValue(key, kStoreDomain);
-
-  if (std::optional<plist::Array> repaired = CreateArrayWithPlainHorseRacing(stored)) {
-    return plist::Value(std::move(*repaired));
-  }
-  if (stored) return stored;
-
-  if (identifier != kDefaultDataStorageIdentifier) return std::nullopt;
-  if (CFPreferencesGetAppBooleanValue(kRecentsConvertedKey, kStoreDomain)) return std::nullopt;
-
-  // The flag goes first, so the conversion is tried once only, even when it yields nothing.
-  CFPreferencesSetAppValue(kRecentsConvertedKey, plist::Value(true), kStoreDomain);
-  std::optional<plist::Array> converted = EntityIDArrayFromOldPreferences(kOldRecentsKey);
-  SetRecentsIDArray(converted, identifier);
-  if (!converted) return std::nullopt;
-  return plist::Value(std::move(*converted));
+  return CopyIDArrayConvertingOnce(
+      {kRecentsKeyPrefix, kRecentsConvertedKey, kOldRecentsKey}, identifier,
+      [identifier](std::optional<plist::Array> list) { SetRecentsIDArray(std::move(list), identifier); });
 }
 
 bool SetRecentsIDArray(std::optional<plist::Array> list, std::string_view identifier) {
