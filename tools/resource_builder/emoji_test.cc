@@ -34,29 +34,25 @@ std::string NameFromComment(std::string_view comment) {
 std::vector<EmojiTestEntry> ParseEmojiTest(std::string_view text) {
   std::vector<EmojiTestEntry> entries;
   std::string group, subgroup;
-  size_t pos = 0;
-  while (pos < text.size()) {
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) end = text.size();
-    std::string_view line = TrimAscii(text.substr(pos, end - pos));
-    pos = end + 1;
+  ForEachLine(text, [&](std::string_view raw) {
+    std::string_view line = TrimAscii(raw);
     if (line.starts_with("# group:")) {
       group = std::string(TrimAscii(line.substr(8)));
-      continue;
+      return;
     }
     if (line.starts_with("# subgroup:")) {
       subgroup = std::string(TrimAscii(line.substr(11)));
-      continue;
+      return;
     }
-    if (line.empty() || line.starts_with("#")) continue;
+    if (line.empty() || line.starts_with("#")) return;
     size_t semi = line.find(';');
     size_t hash = line.find('#');
-    if (semi == std::string_view::npos || hash == std::string_view::npos || hash < semi) continue;
+    if (semi == std::string_view::npos || hash == std::string_view::npos || hash < semi) return;
     std::optional<std::u32string> sequence = ParseCodePointSequence(TrimAscii(line.substr(0, semi)));
     std::optional<EmojiStatus> status = ParseStatus(TrimAscii(line.substr(semi + 1, hash - semi - 1)));
-    if (!sequence || !status) continue;
+    if (!sequence || !status) return;
     entries.push_back({std::move(*sequence), *status, group, subgroup, NameFromComment(line.substr(hash + 1))});
-  }
+  });
   return entries;
 }
 

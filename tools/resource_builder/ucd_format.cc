@@ -43,17 +43,22 @@ std::optional<std::u32string> ParseCodePointSequence(std::string_view hex_list) 
   return out;
 }
 
-void ForEachUcdRecord(std::string_view text,
-                      const std::function<void(std::span<const std::string_view>)>& record) {
-  std::vector<std::string_view> fields;
+void ForEachLine(std::string_view text, const std::function<void(std::string_view)>& line) {
   size_t pos = 0;
   while (pos < text.size()) {
     size_t end = text.find('\n', pos);
     if (end == std::string_view::npos) end = text.size();
-    std::string_view line = text.substr(pos, end - pos);
+    line(text.substr(pos, end - pos));
     pos = end + 1;
+  }
+}
+
+void ForEachUcdRecord(std::string_view text,
+                      const std::function<void(std::span<const std::string_view>)>& record) {
+  std::vector<std::string_view> fields;
+  ForEachLine(text, [&](std::string_view line) {
     if (size_t hash = line.find('#'); hash != std::string_view::npos) line = line.substr(0, hash);
-    if (TrimAscii(line).empty()) continue;
+    if (TrimAscii(line).empty()) return;
     fields.clear();
     size_t start = 0;
     while (true) {
@@ -63,7 +68,7 @@ void ForEachUcdRecord(std::string_view text,
       start = semi + 1;
     }
     record(fields);
-  }
+  });
 }
 
 std::vector<CodePointRange> ParseCodePointRanges(std::string_view text) {

@@ -22,6 +22,9 @@ std::optional<char32_t> ParseCodePoint(std::string_view hex);
 // Space-separated hexadecimal code points; nullopt when any of them is malformed or none is given.
 std::optional<std::u32string> ParseCodePointSequence(std::string_view hex_list);
 
+// Calls `line` with every line of `text`, without its "\n"; a last line without one counts too.
+void ForEachLine(std::string_view text, const std::function<void(std::string_view)>& line);
+
 // Calls `record` with the trimmed ";"-separated fields of every line that is not empty once its
 // "#" comment is removed.
 void ForEachUcdRecord(std::string_view text,

@@ -20,22 +20,17 @@ void UnihanTable::Add(char32_t cp, std::string_view field, std::string_view valu
 }
 
 void AddUnihanRecords(std::string_view text, std::span<const std::string_view> fields, UnihanTable& table) {
-  size_t pos = 0;
-  while (pos < text.size()) {
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) end = text.size();
-    std::string_view line = text.substr(pos, end - pos);
-    pos = end + 1;
-    if (!line.starts_with("U+")) continue;
+  ForEachLine(text, [&](std::string_view line) {
+    if (!line.starts_with("U+")) return;
     size_t tab1 = line.find('\t');
     size_t tab2 = tab1 == std::string_view::npos ? tab1 : line.find('\t', tab1 + 1);
-    if (tab2 == std::string_view::npos) continue;
+    if (tab2 == std::string_view::npos) return;
     std::string_view field = line.substr(tab1 + 1, tab2 - tab1 - 1);
-    if (std::find(fields.begin(), fields.end(), field) == fields.end()) continue;
+    if (std::find(fields.begin(), fields.end(), field) == fields.end()) return;
     std::optional<char32_t> cp = ParseCodePoint(line.substr(2, tab1 - 2));
     std::string_view value = TrimAscii(line.substr(tab2 + 1));
     if (cp && !value.empty()) table.Add(*cp, field, value);
-  }
+  });
 }
 
 std::vector<char32_t> ParseUnihanCodePoints(std::string_view value) {
