@@ -21,6 +21,7 @@
 
 #include "client/service_client.h"
 #include "service/socket_path.h"
+#include "stop_service.h"
 
 namespace lumeris {
 namespace {
@@ -37,25 +38,6 @@ MessageValue SmallRequest() {
 
 double Microseconds(Clock::duration d) {
   return std::chrono::duration<double, std::micro>(d).count();
-}
-
-// Stops the service listening on the usual socket (found by its peer credentials).
-void StopService() {
-  std::filesystem::path path = *ServiceSocketPath();
-  int fd = socket(AF_UNIX, SOCK_STREAM, 0);
-  sockaddr_un address{};
-  address.sun_family = AF_UNIX;
-  std::snprintf(address.sun_path, sizeof address.sun_path, "%s", path.c_str());
-  ucred peer{};
-  socklen_t size = sizeof peer;
-  if (connect(fd, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0 &&
-      getsockopt(fd, SOL_SOCKET, SO_PEERCRED, &peer, &size) == 0 && peer.pid > 0) {
-    close(fd);
-    kill(peer.pid, SIGTERM);
-    while (kill(peer.pid, 0) == 0) std::this_thread::sleep_for(1ms);
-    return;
-  }
-  close(fd);
 }
 
 void OnDemandStart(int rounds) {

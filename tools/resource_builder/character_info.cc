@@ -139,21 +139,41 @@ InfoFields HanInfoFields(char32_t cp, const UnihanTable& unihan) {
   return fields;
 }
 
+std::vector<const EmojiTestEntry*> EmojiInSearchOrder(const std::vector<EmojiTestEntry>& emoji) {
+  std::vector<const EmojiTestEntry*> ordered;
+  for (const EmojiTestEntry& entry : emoji) {
+    if (entry.status == EmojiStatus::kFullyQualified && !HasSkinTone(entry.sequence)) {
+      ordered.push_back(&entry);
+    }
+  }
+  // Search walks the rows in this order, so it is the ranking a person sees. A short name is the
+  // emoji the word names most directly ("fire" before "firefighter"); among names of one length,
+  // fewer code points is the base form (before its gender and ZWJ variants); the emoji test
+  // file's own order settles the rest.
+  auto code_points = [](const EmojiTestEntry* entry) {
+    return std::count_if(entry->sequence.begin(), entry->sequence.end(), [](char32_t cp) { return cp != 0xFE0F; });
+  };
+  std::stable_sort(ordered.begin(), ordered.end(), [&](const EmojiTestEntry* a, const EmojiTestEntry* b) {
+    if (a->name.size() != b->name.size()) return a->name.size() < b->name.size();
+    return code_points(a) < code_points(b);
+  });
+  return ordered;
+}
+
 std::vector<CharacterRow> BuildCharacterRows(const CharacterSources& sources) {
   std::vector<CharacterRow> rows;
   rows.reserve(sources.unicode.records().size() + sources.emoji.size());
   std::unordered_set<std::string> emitted;
-  for (const EmojiTestEntry& entry : sources.emoji) {
-    if (entry.status != EmojiStatus::kFullyQualified) continue;
-    std::string uchr = ToUtf8(entry.sequence);
+  for (const EmojiTestEntry* entry : EmojiInSearchOrder(sources.emoji)) {
+    std::string uchr = ToUtf8(entry->sequence);
     if (!emitted.insert(uchr).second) continue;
-    if (entry.sequence.size() == 1) {
-      const CodePointRecord* record = sources.unicode.Find(entry.sequence[0]);
+    if (entry->sequence.size() == 1) {
+      const CodePointRecord* record = sources.unicode.Find(entry->sequence[0]);
       if (record == nullptr) continue;  // left for the code-point pass, which skips it as well
       InfoFields fields = CodePointFields(*record, sources);
       rows.push_back({std::move(uchr), JoinInfoFields(fields)});
     } else {
-      rows.push_back({std::move(uchr), JoinInfoFields(SequenceFields(entry, sources))});
+      rows.push_back({std::move(uchr), JoinInfoFields(SequenceFields(*entry, sources))});
     }
   }
   std::string uchr;

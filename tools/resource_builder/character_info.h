@@ -43,9 +43,16 @@ struct CharacterSources {
   const std::vector<EmojiTestEntry>& emoji;
 };
 
-// The rows in database order: first the fully-qualified emoji in emoji-test order, then every
-// other listed code point in ascending order. Every `uchr` occurs once.
+// The rows in database order: first the fully-qualified emoji without a skin-tone modifier in
+// EmojiInSearchOrder, then every other listed code point in ascending order. Every `uchr` occurs
+// once. Skin-toned forms have no row: the panel applies the user's remembered skin tone itself,
+// and their information is looked up under the normalized (toneless) key.
 std::vector<CharacterRow> BuildCharacterRows(const CharacterSources& sources);
+
+// The fully-qualified emoji of `emoji` without skin-tone modifiers, in the order search shows
+// them: shorter names first, then fewer code points (U+FE0F not counted), then file order.
+// The pointers point into `emoji`.
+std::vector<const EmojiTestEntry*> EmojiInSearchOrder(const std::vector<EmojiTestEntry>& emoji);
 
 // The Han fields (1-15) of `cp` from Unihan; all empty when Unihan has nothing for it.
 InfoFields HanInfoFields(char32_t cp, const UnihanTable& unihan);
