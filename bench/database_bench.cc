@@ -74,7 +74,8 @@ void StopService() {
 
 double Percentile(std::vector<double> samples, int percent) {
   std::sort(samples.begin(), samples.end());
-  return samples[std::min(samples.size() - 1, samples.size() * static_cast<std::size_t>(percent) / 100)];
+  return samples[std::min(samples.size() - 1,
+                          samples.size() * static_cast<std::size_t>(percent) / 100)];
 }
 
 int Main() {
@@ -89,7 +90,8 @@ int Main() {
   setenv("XDG_RUNTIME_DIR", (root / "runtime").c_str(), 1);
   setenv("LUMERIS_SYSTEM_ROOT", LUMERIS_BENCH_SYSTEM_ROOT, 0);
   setenv("LUMERIS_FONTCONFIG_FILE", LUMERIS_BENCH_FONTCONFIG_FILE, 0);
-  if (getenv("LUMERIS_FILESERVICE") == nullptr) setenv("LUMERIS_FILESERVICE", LUMERIS_BENCH_FILESERVICE, 1);
+  if (getenv("LUMERIS_FILESERVICE") == nullptr)
+    setenv("LUMERIS_FILESERVICE", LUMERIS_BENCH_FILESERVICE, 1);
 
   std::vector<std::string> words;
   std::ifstream list(LUMERIS_BENCH_WORDS);
@@ -106,14 +108,17 @@ int Main() {
   // The first request opens the database and loads the fonts; it is timed apart.
   const double first = Time(*client, {Request("search_matched_chars", "heart", 20)})[0];
   std::vector<MessageValue> searches;
-  for (const std::string& word : words) searches.push_back(Request("search_matched_chars", word, 20));
+  for (const std::string& word : words)
+    searches.push_back(Request("search_matched_chars", word, 20));
   const std::vector<double> search = Time(*client, searches);
   std::printf("first search (opens the database): %.1f ms\n", first);
   std::printf("search, %zu keywords, limit 20: p50 %.1f ms, p99 %.1f ms\n", search.size(),
               Percentile(search, 50), Percentile(search, 99));
   for (const char* letter : {"a", "e"}) {
-    const std::vector<double> samples = Time(*client, std::vector<MessageValue>(5, Request("search_matched_chars", letter, 100)));
-    std::printf("search \"%s\", limit 100: p50 %.1f ms (5 runs)\n", letter, Percentile(samples, 50));
+    const std::vector<double> samples =
+        Time(*client, std::vector<MessageValue>(5, Request("search_matched_chars", letter, 100)));
+    std::printf("search \"%s\", limit 100: p50 %.1f ms (5 runs)\n", letter,
+                Percentile(samples, 50));
   }
   std::vector<MessageValue> related;
   std::vector<MessageValue> info;
@@ -123,9 +128,10 @@ int Main() {
       info.push_back(Request("search_character_info", character, 0));
     }
   }
-  std::printf("related characters, limit 100: p50 %.2f ms (%zu requests)\n", Percentile(Time(*client, related), 50),
-              related.size());
-  std::printf("information record: p50 %.3f ms (%zu requests)\n", Percentile(Time(*client, info), 50), info.size());
+  std::printf("related characters, limit 100: p50 %.2f ms (%zu requests)\n",
+              Percentile(Time(*client, related), 50), related.size());
+  std::printf("information record: p50 %.3f ms (%zu requests)\n",
+              Percentile(Time(*client, info), 50), info.size());
 
   client.reset();
   StopService();

@@ -70,7 +70,8 @@ std::string ShortCharacterName(std::string_view names) {
   return std::string(names);
 }
 
-std::string FormatCharacters(const MessageValue* result, const std::map<std::string, std::string>* names) {
+std::string FormatCharacters(const MessageValue* result,
+                             const std::map<std::string, std::string>* names) {
   std::string text;
   if (result == nullptr || !result->is_array()) return text;
   for (const MessageValue& element : *result->AsArray()) {
@@ -95,8 +96,8 @@ std::string FormatCharacterInfo(std::string_view character, const MessageValue* 
   for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
     const MessageValue* value = record->Find(kCharacterInfoTags[i]);
     const std::string* field = value ? value->AsString() : nullptr;
-    text += std::string(kCharacterInfoTags[i]) + "\t" + std::string(kCharacterInfoMeanings[i]) + "\t" +
-            (field ? *field : std::string()) + "\n";
+    text += std::string(kCharacterInfoTags[i]) + "\t" + std::string(kCharacterInfoMeanings[i]) +
+            "\t" + (field ? *field : std::string()) + "\n";
   }
   for (const auto& [key, value] : *fields) {
     if (std::find(kCharacterInfoTags.begin(), kCharacterInfoTags.end(), key) !=

@@ -27,10 +27,10 @@ inline constexpr std::array<std::string_view, 16> kCharacterInfoTags = {
 
 // What each of the sixteen fields holds, parallel to kCharacterInfoTags.
 inline constexpr std::array<std::string_view, 16> kCharacterInfoMeanings = {
-    "names and keywords",  "Japanese readings",     "Korean reading",         "pinyin (mainland)",
-    "Wubi code",           "Wubi strokes",          "strokes (mainland)",     "Cantonese (Jyutping)",
-    "Cangjie code",        "Dayi code",             "pinyin (Taiwan)",        "Zhuyin",
-    "radical-stroke 1",    "radical-stroke 2",      "radical-stroke 3",       "radical-stroke 4"};
+    "names and keywords", "Japanese readings", "Korean reading",     "pinyin (mainland)",
+    "Wubi code",          "Wubi strokes",      "strokes (mainland)", "Cantonese (Jyutping)",
+    "Cangjie code",       "Dayi code",         "pinyin (Taiwan)",    "Zhuyin",
+    "radical-stroke 1",   "radical-stroke 2",  "radical-stroke 3",   "radical-stroke 4"};
 
 // The first words of a character's names (field "unam"): the text before the first "; ", cut
 // after six words.

@@ -28,7 +28,8 @@ class Statement {
     sqlite3_free(sql_);
   }
   bool Prepare(sqlite3* db) {
-    return sqlite3_prepare_v2(db, sql_, static_cast<int>(strlen(sql_)), &statement_, nullptr) == SQLITE_OK;
+    return sqlite3_prepare_v2(db, sql_, static_cast<int>(strlen(sql_)), &statement_, nullptr) ==
+           SQLITE_OK;
   }
   bool Step() { return sqlite3_step(statement_) == SQLITE_ROW; }
   sqlite3_stmt* get() const { return statement_; }
@@ -50,7 +51,8 @@ struct SearchBucket {
   std::vector<icu::UnicodeString> deferred;
 };
 
-std::optional<std::filesystem::path> ApplicationBundleResource(std::string_view name, std::string_view type) {
+std::optional<std::filesystem::path> ApplicationBundleResource(std::string_view name,
+                                                               std::string_view type) {
   std::optional<Bundle> bundle = OpenApplicationBundle();
   if (!bundle) return std::nullopt;
   return bundle->PathForResource(name, type);
@@ -81,7 +83,8 @@ sqlite3* LMCharacterDatabase::_openDatabase(std::string_view name) {
   return db;
 }
 
-LMCharacterDatabase::Connection* LMCharacterDatabase::Open(Connection& connection, std::string_view name) {
+LMCharacterDatabase::Connection* LMCharacterDatabase::Open(Connection& connection,
+                                                           std::string_view name) {
   std::lock_guard lock(open_mutex_);
   if (connection.handle == nullptr) connection.handle = _openDatabase(name);
   return connection.handle != nullptr ? &connection : nullptr;
@@ -98,7 +101,8 @@ const plist::Dictionary* LMCharacterDatabase::_hanLanguageInfo() {
   return _languageInfo.get();
 }
 
-std::optional<plist::Value> LMCharacterDatabase::LanguageListEntry(std::string_view list, std::string_view key) {
+std::optional<plist::Value> LMCharacterDatabase::LanguageListEntry(std::string_view list,
+                                                                   std::string_view key) {
   const plist::Dictionary* info = _hanLanguageInfo();
   if (info == nullptr) return std::nullopt;
   auto table = info->find(list);
@@ -123,7 +127,8 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
   if (connection == nullptr) return MessageValue::Null();
   const std::optional<std::string> utf8 = EncodeUtf8(text);
   if (!utf8) return MessageValue::Null();
-  char* sql = sqlite3_mprintf("select * from unihan_dict where info like '%%%q%%' ;", utf8->c_str());
+  char* sql =
+      sqlite3_mprintf("select * from unihan_dict where info like '%%%q%%' ;", utf8->c_str());
   if (sql == nullptr) return MessageValue::Null();
   Statement statement(sql);
   std::lock_guard lock(connection->query_mutex);
@@ -151,8 +156,9 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
       }
       if (field == last_field) continue;
       // A row with more than sixteen fields: the extra ones have no search tag.
-      const std::string_view tag =
-          static_cast<std::size_t>(field) < SearchFieldTags.size() ? SearchFieldTags[static_cast<std::size_t>(field)] : "";
+      const std::string_view tag = static_cast<std::size_t>(field) < SearchFieldTags.size()
+                                       ? SearchFieldTags[static_cast<std::size_t>(field)]
+                                       : "";
       int32_t field_end = decoded->indexOf(u'|', match->end);
       if (field_end < 0) field_end = decoded->length();
       last_field = field;
@@ -166,7 +172,8 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
       if (fonts_.emoji_font_draws(*candidate)) {
         bucket.emoji.emplace_back(uchr);
         // Unsigned on purpose: a limit of 2^63 or more never fills a bucket.
-        if (static_cast<std::uint64_t>(bucket.emoji.size()) >= static_cast<std::uint64_t>(maxCount)) {
+        if (static_cast<std::uint64_t>(bucket.emoji.size()) >=
+            static_cast<std::uint64_t>(maxCount)) {
           bucket.full = true;
         }
       } else {
@@ -178,7 +185,8 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
   MessageValue result = MessageValue::MakeArray();
   for (SearchBucket& bucket : buckets) {
     if (!bucket.used) continue;
-    for (std::string& character : bucket.emoji) result.Append(MessageValue::String(std::move(character)));
+    for (std::string& character : bucket.emoji)
+      result.Append(MessageValue::String(std::move(character)));
     const auto n = static_cast<std::int64_t>(bucket.emoji.size());
     // Signed on purpose: a limit of 2^63 or more admits no deferred character.
     if (bucket.deferred.empty() || n >= maxCount) continue;
@@ -192,15 +200,16 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
   return result;
 }
 
-MessageValue LMCharacterDatabase::createXPCArrayForRelatedCharacters(const icu::UnicodeString& character,
-                                                                     std::int64_t maxCount) {
+MessageValue LMCharacterDatabase::createXPCArrayForRelatedCharacters(
+    const icu::UnicodeString& character, std::int64_t maxCount) {
   Connection* connection = Open(_relatedCharDatabase, "RelatedCharDB");
   if (connection == nullptr) return MessageValue::Null();
   const std::optional<std::string> utf8 = EncodeUtf8(character);
   if (!utf8) return MessageValue::Null();
   // "!" escapes the first letter, so a "%" or "_" asked for matches only itself.
-  char* sql = sqlite3_mprintf("select relatedChars from related_dict where relatedChars like '%%!%q%%' escape '!';",
-                              utf8->c_str());
+  char* sql = sqlite3_mprintf(
+      "select relatedChars from related_dict where relatedChars like '%%!%q%%' escape '!';",
+      utf8->c_str());
   if (sql == nullptr) return MessageValue::Null();
   Statement statement(sql);
   MessageValue result = MessageValue::MakeArray();
@@ -226,7 +235,8 @@ MessageValue LMCharacterDatabase::createXPCArrayForRelatedCharacters(const icu::
   return result;
 }
 
-std::optional<CharacterInfoRecord> LMCharacterDatabase::searchCharacterInfo(const icu::UnicodeString& character) {
+std::optional<CharacterInfoRecord> LMCharacterDatabase::searchCharacterInfo(
+    const icu::UnicodeString& character) {
   Connection* connection = Open(_charDatabase, "CharacterDB");
   if (connection == nullptr) return std::nullopt;
   const std::optional<icu::UnicodeString> key = ReplacementDictionaryNormalizedKeyString(character);
@@ -246,7 +256,8 @@ std::optional<CharacterInfoRecord> LMCharacterDatabase::searchCharacterInfo(cons
     if (info == nullptr || *info == '\0' || !DecodeUtf8(info)) continue;
     std::vector<std::string_view> fields;
     std::string_view rest(info);
-    for (std::size_t bar; (bar = rest.find('|')) != std::string_view::npos; rest.remove_prefix(bar + 1)) {
+    for (std::size_t bar; (bar = rest.find('|')) != std::string_view::npos;
+         rest.remove_prefix(bar + 1)) {
       fields.push_back(rest.substr(0, bar));
     }
     fields.push_back(rest);
@@ -260,7 +271,8 @@ std::optional<CharacterInfoRecord> LMCharacterDatabase::searchCharacterInfo(cons
   return std::nullopt;
 }
 
-MessageValue LMCharacterDatabase::createXPCDictionaryForCharacterInfo(const icu::UnicodeString& character) {
+MessageValue LMCharacterDatabase::createXPCDictionaryForCharacterInfo(
+    const icu::UnicodeString& character) {
   MessageValue dictionary = MessageValue::MakeDictionary();
   if (std::optional<CharacterInfoRecord> record = searchCharacterInfo(character)) {
     for (auto& [tag, value] : *record) dictionary.Set(tag, MessageValue::String(value));

@@ -26,6 +26,7 @@
 #pragma once
 
 #include <sqlite3.h>
+#include <unicode/unistr.h>
 
 #include <cstdint>
 #include <filesystem>
@@ -36,8 +37,6 @@
 #include <optional>
 #include <string>
 #include <string_view>
-
-#include <unicode/unistr.h>
 
 #include "database/font_queries.h"
 #include "platform/property_list.h"
@@ -51,8 +50,8 @@ using CharacterInfoRecord = std::map<std::string, std::string, std::less<>>;
 class LMCharacterDatabase {
  public:
   // Where a resource of the bundle is: (name, type) -> path, or std::nullopt.
-  using ResourcePathLookup =
-      std::function<std::optional<std::filesystem::path>(std::string_view name, std::string_view type)>;
+  using ResourcePathLookup = std::function<std::optional<std::filesystem::path>(
+      std::string_view name, std::string_view type)>;
 
   // The one instance of the process, with the input-method bundle's resources and the installed
   // fonts. Created on first use, never destroyed.

@@ -14,7 +14,8 @@ icu::UnicodeString RequestText(const std::string& utf8) {
 }  // namespace
 
 void InstallDatabaseOperations(ServiceOperations& operations) {
-  operations.UpdateCountryInfoAndCheckSignificantChange = UpdateCountryInfoAndCheckSignificantChange;
+  operations.UpdateCountryInfoAndCheckSignificantChange =
+      UpdateCountryInfoAndCheckSignificantChange;
   operations.createXPCArrayForSearchString = [](const std::string& text, std::uint64_t limit) {
     return LMCharacterDatabase::sharedDatabase().createXPCArrayForSearchString(
         RequestText(text), static_cast<std::int64_t>(limit));
@@ -24,7 +25,8 @@ void InstallDatabaseOperations(ServiceOperations& operations) {
         RequestText(text), static_cast<std::int64_t>(limit));
   };
   operations.createXPCDictionaryForCharacterInfo = [](const std::string& text) {
-    return LMCharacterDatabase::sharedDatabase().createXPCDictionaryForCharacterInfo(RequestText(text));
+    return LMCharacterDatabase::sharedDatabase().createXPCDictionaryForCharacterInfo(
+        RequestText(text));
   };
 }
 

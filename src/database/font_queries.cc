@@ -6,8 +6,12 @@ namespace lumeris {
 
 FontQueries FontQueries::Installed() {
   return FontQueries{
-      .emoji_font_draws = [](const icu::UnicodeString& text) { return ColorFontDrawsString(kColorEmojiFontName, text); },
-      .default_like_font_draws = [](const icu::UnicodeString& text) { return DefaultLikeFontDrawsString(text); },
+      .emoji_font_draws =
+          [](const icu::UnicodeString& text) {
+            return ColorFontDrawsString(kColorEmojiFontName, text);
+          },
+      .default_like_font_draws =
+          [](const icu::UnicodeString& text) { return DefaultLikeFontDrawsString(text); },
   };
 }
 

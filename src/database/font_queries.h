@@ -9,9 +9,9 @@
 // platform/font_coverage.h); a test's queries must be as safe as the test needs.
 #pragma once
 
-#include <functional>
-
 #include <unicode/unistr.h>
+
+#include <functional>
 
 namespace lumeris {
 

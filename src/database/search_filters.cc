@@ -66,13 +66,15 @@ CaseInsensitiveText::CaseInsensitiveText(const icu::UnicodeString& text) : origi
   folded_index_[static_cast<std::size_t>(length)] = folded_.length();
 }
 
-std::optional<CaseInsensitiveText::Match> CaseInsensitiveText::Find(const icu::UnicodeString& folded_needle,
-                                                                    int32_t from) const {
+std::optional<CaseInsensitiveText::Match> CaseInsensitiveText::Find(
+    const icu::UnicodeString& folded_needle, int32_t from) const {
   if (folded_needle.isEmpty() || from < 0 || from > original_.length()) return std::nullopt;
-  const int32_t position = folded_.indexOf(folded_needle, folded_index_[static_cast<std::size_t>(from)]);
+  const int32_t position =
+      folded_.indexOf(folded_needle, folded_index_[static_cast<std::size_t>(from)]);
   if (position < 0) return std::nullopt;
   const int32_t last = position + folded_needle.length() - 1;
-  return Match{folded_start_[static_cast<std::size_t>(position)], folded_end_[static_cast<std::size_t>(last)]};
+  return Match{folded_start_[static_cast<std::size_t>(position)],
+               folded_end_[static_cast<std::size_t>(last)]};
 }
 
 }  // namespace lumeris

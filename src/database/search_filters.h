@@ -12,11 +12,11 @@
 // process-wide flag (categories/regional_restriction.h).
 #pragma once
 
+#include <unicode/unistr.h>
+
 #include <cstdint>
 #include <optional>
 #include <vector>
-
-#include <unicode/unistr.h>
 
 namespace lumeris {
 
@@ -54,7 +54,8 @@ class CaseInsensitiveText {
   icu::UnicodeString folded_;
   std::vector<int32_t> folded_start_;  // per folded unit: start of its original code point
   std::vector<int32_t> folded_end_;    // per folded unit: end of its original code point
-  std::vector<int32_t> folded_index_;  // per original index (and the end): first folded unit at or after it
+  std::vector<int32_t>
+      folded_index_;  // per original index (and the end): first folded unit at or after it
 };
 
 }  // namespace lumeris

@@ -25,7 +25,8 @@ std::once_flag configuration_once;
 bool configuration_loaded = false;
 
 std::filesystem::path ConfigurationFile() {
-  if (const char* path = getenv("LUMERIS_FONTCONFIG_FILE"); path != nullptr && *path != '\0') return path;
+  if (const char* path = getenv("LUMERIS_FONTCONFIG_FILE"); path != nullptr && *path != '\0')
+    return path;
   return config::kFontConfigFileDefault;
 }
 
@@ -36,8 +37,10 @@ void LoadConfiguration() {
     Log("fontconfig: cannot load the default configuration");
     return;
   }
-  if (FcConfigParseAndLoad(config, reinterpret_cast<const FcChar8*>(file.c_str()), FcTrue) != FcTrue) {
-    Log("fontconfig: cannot load " + file.string() + "; the colour emoji font name stays unresolved");
+  if (FcConfigParseAndLoad(config, reinterpret_cast<const FcChar8*>(file.c_str()), FcTrue) !=
+      FcTrue) {
+    Log("fontconfig: cannot load " + file.string() +
+        "; the colour emoji font name stays unresolved");
     FcConfigDestroy(config);
     return;
   }
@@ -80,7 +83,8 @@ class ColorFont {
       return;
     }
     FcPattern* pattern = FcPatternCreate();
-    FcPatternAddString(pattern, FC_FAMILY, reinterpret_cast<const FcChar8*>(std::string(family).c_str()));
+    FcPatternAddString(pattern, FC_FAMILY,
+                       reinterpret_cast<const FcChar8*>(std::string(family).c_str()));
     FcConfigSubstitute(nullptr, pattern, FcMatchPattern);
     FcDefaultSubstitute(pattern);
     FcResult result = FcResultNoMatch;
@@ -112,9 +116,8 @@ class ColorFont {
     if (face_ == nullptr) return false;
     auto [it, inserted] = answers_.try_emplace(CacheKey(text), false);
     if (inserted) {
-      it->second = CoversEveryCodePoint(text, [&](UChar32 c) {
-        return FT_Get_Char_Index(face_, static_cast<FT_ULong>(c)) != 0;
-      });
+      it->second = CoversEveryCodePoint(
+          text, [&](UChar32 c) { return FT_Get_Char_Index(face_, static_cast<FT_ULong>(c)) != 0; });
     }
     return it->second;
   }
@@ -195,7 +198,8 @@ bool ColorFontDrawsString(std::string_view family, const icu::UnicodeString& tex
   {
     std::lock_guard lock(fonts_mutex);
     auto it = fonts->find(family);
-    if (it == fonts->end()) it = fonts->emplace(std::string(family), std::make_unique<ColorFont>(family)).first;
+    if (it == fonts->end())
+      it = fonts->emplace(std::string(family), std::make_unique<ColorFont>(family)).first;
     font = it->second.get();
   }
   return font->Draws(text);

@@ -1,9 +1,9 @@
 // Font coverage: which installed fonts can draw a string, the two questions character search and
 // related characters ask about every candidate.
 //
-//   LoadLumerisFontConfiguration();                       // once, at the service's start
-//   bool emoji = ColorFontDrawsString("VantorelColorEmoji", u"❤️");   // true with Noto Color Emoji
-//   bool any = DefaultLikeFontDrawsString(u"é");                       // true with DejaVu Sans
+//   LoadLumerisFontConfiguration();   // once, at the service's start
+//   ColorFontDrawsString("VantorelColorEmoji", text)   // "❤️": true with Noto Color Emoji
+//   DefaultLikeFontDrawsString(text)                   // "é": true with DejaVu Sans
 //
 // ColorFontDrawsString asks fontconfig for the best match of the family name; the answer is
 // false for every string when that match is not a colour font (so a missing emoji font draws
@@ -26,9 +26,9 @@
 // query are not seen.
 #pragma once
 
-#include <string_view>
-
 #include <unicode/unistr.h>
+
+#include <string_view>
 
 namespace lumeris {
 

@@ -1,5 +1,7 @@
 // Regional hiding: the "Country" preference (any application, any user, current host) and the
 // locale's country decide whether the flag U+1F1F9 U+1F1FC is hidden.
+#include "categories/regional_restriction.h"
+
 #include <gtest/gtest.h>
 
 #include <filesystem>
@@ -7,7 +9,6 @@
 #include <optional>
 #include <string>
 
-#include "categories/regional_restriction.h"
 #include "platform/preferences_paths.h"
 #include "platform/property_list.h"
 #include "platform/property_list_io.h"
@@ -22,14 +23,15 @@ class RegionalRestrictionTest : public ::testing::Test {
   // Writes (or, for std::nullopt, removes) the "Country" preference the way another process
   // would: a new file renamed over the old one.
   void SetCountryPreference(const std::optional<std::string>& country) {
-    const std::filesystem::path path =
-        *PreferencesFilePath(".GlobalPreferences", kCFPreferencesAnyUser, kCFPreferencesCurrentHost);
+    const std::filesystem::path path = *PreferencesFilePath(
+        ".GlobalPreferences", kCFPreferencesAnyUser, kCFPreferencesCurrentHost);
     std::filesystem::create_directories(path.parent_path());
     if (!country) {
       std::filesystem::remove(path);
       return;
     }
-    const std::string xml = plist::SerializeXmlPropertyList(plist::Dictionary{{"Country", *country}});
+    const std::string xml =
+        plist::SerializeXmlPropertyList(plist::Dictionary{{"Country", *country}});
     std::ofstream(path.string() + ".new") << xml;
     std::filesystem::rename(path.string() + ".new", path);
   }

@@ -1,5 +1,7 @@
 // The rules of the three character requests, each pinned by rows written for it into small
 // databases, with font answers chosen by the test.
+#include "database/character_database.h"
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sqlite3.h>
@@ -11,7 +13,6 @@
 #include <string>
 #include <vector>
 
-#include "database/character_database.h"
 #include "platform/property_list.h"
 #include "platform/property_list_io.h"
 #include "support/temp_dir.h"
@@ -35,8 +36,8 @@ void Execute(sqlite3* db, const std::string& sql) {
   ASSERT_EQ(sqlite3_exec(db, sql.c_str(), nullptr, nullptr, &error), SQLITE_OK) << error;
 }
 
-void WriteTable(const std::filesystem::path& path, const std::string& create, const std::string& insert,
-                const Rows& rows) {
+void WriteTable(const std::filesystem::path& path, const std::string& create,
+                const std::string& insert, const Rows& rows) {
   sqlite3* db = nullptr;
   ASSERT_EQ(sqlite3_open(path.c_str(), &db), SQLITE_OK);
   Execute(db, create);
@@ -44,7 +45,8 @@ void WriteTable(const std::filesystem::path& path, const std::string& create, co
     sqlite3_stmt* statement = nullptr;
     ASSERT_EQ(sqlite3_prepare_v2(db, insert.c_str(), -1, &statement, nullptr), SQLITE_OK);
     sqlite3_bind_text(statement, 1, first.data(), static_cast<int>(first.size()), SQLITE_TRANSIENT);
-    sqlite3_bind_text(statement, 2, second.data(), static_cast<int>(second.size()), SQLITE_TRANSIENT);
+    sqlite3_bind_text(statement, 2, second.data(), static_cast<int>(second.size()),
+                      SQLITE_TRANSIENT);
     EXPECT_EQ(sqlite3_step(statement), SQLITE_DONE);
     sqlite3_finalize(statement);
   }
@@ -62,20 +64,29 @@ class CharacterDatabaseTest : public ::testing::Test {
   void WriteRelated(const Strings& groups) {
     Rows rows;
     for (const std::string& group : groups) rows.emplace_back(group, "");
-    WriteTable(dir_.path() / "RelatedCharDB.sqlite3", "create table related_dict (relatedChars text, unused text)",
+    WriteTable(dir_.path() / "RelatedCharDB.sqlite3",
+               "create table related_dict (relatedChars text, unused text)",
                "insert into related_dict values (?, ?)", rows);
   }
 
   LMCharacterDatabase& Database() {
     if (!database_) {
       FontQueries fonts{
-          .emoji_font_draws = [this](const icu::UnicodeString& s) { return emoji_.count(EncodeUtf8Lenient(s)) > 0; },
-          .default_like_font_draws = [this](const icu::UnicodeString& s) { return !undrawable_.count(EncodeUtf8Lenient(s)); },
+          .emoji_font_draws =
+              [this](const icu::UnicodeString& s) {
+                return emoji_.count(EncodeUtf8Lenient(s)) > 0;
+              },
+          .default_like_font_draws =
+              [this](const icu::UnicodeString& s) {
+                return !undrawable_.count(EncodeUtf8Lenient(s));
+              },
       };
       database_ = std::make_unique<LMCharacterDatabase>(
-          [this](std::string_view name, std::string_view type) -> std::optional<std::filesystem::path> {
+          [this](std::string_view name,
+                 std::string_view type) -> std::optional<std::filesystem::path> {
             looked_up_.emplace_back(name);
-            std::filesystem::path path = dir_.path() / (std::string(name) + "." + std::string(type));
+            std::filesystem::path path =
+                dir_.path() / (std::string(name) + "." + std::string(type));
             if (!std::filesystem::exists(path)) return std::nullopt;
             return path;
           },
@@ -86,10 +97,12 @@ class CharacterDatabaseTest : public ::testing::Test {
 
   // The strings of an array result; "null" for a null result.
   Strings Search(const std::string& text, std::uint64_t limit) {
-    return Flatten(Database().createXPCArrayForSearchString(*DecodeUtf8(text), static_cast<std::int64_t>(limit)));
+    return Flatten(Database().createXPCArrayForSearchString(*DecodeUtf8(text),
+                                                            static_cast<std::int64_t>(limit)));
   }
   Strings Related(const std::string& text, std::uint64_t limit) {
-    return Flatten(Database().createXPCArrayForRelatedCharacters(*DecodeUtf8(text), static_cast<std::int64_t>(limit)));
+    return Flatten(Database().createXPCArrayForRelatedCharacters(*DecodeUtf8(text),
+                                                                 static_cast<std::int64_t>(limit)));
   }
   static Strings Flatten(const MessageValue& value) {
     if (value.is_null()) return {"null"};
@@ -110,8 +123,8 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
       {"♡", Info("white heart suit")},
       {"❤\uFE0F", Info("red heart; heart; HEART")},
       {"💙", Info("blue heart")},
-      {"ℵ", Info("alef", "heart")},            // only a later field holds the text
-      {"ﬀ", Info("ﬀﬀﬀﬀﬀﬀﬀﬀﬀﬀ oak")},         // folding doubles field 0's length before the match
+      {"ℵ", Info("alef", "heart")},   // only a later field holds the text
+      {"ﬀ", Info("ﬀﬀﬀﬀﬀﬀﬀﬀﬀﬀ oak")},  // folding doubles field 0's length before the match
       {"É", Info("ÉCLAIR")},
       {"ß", Info("Straße")},
       {"1", Info("100% sure")},
@@ -142,7 +155,7 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
       {"ÉCLAIR", {"É"}},
       {"STRASSE", {}},
       {"STRAßE", {"ß"}},  // LIKE passes "STRA"; the second search folds ß
-      {"100%", {"1"}},     // "%" is a wildcard for LIKE only
+      {"100%", {"1"}},    // "%" is a wildcard for LIKE only
       {"a_b", {"3"}},
       {"it's", {"5"}},
       {"mark", {"✓"}},  // white space, ignorable, control, empty, broken and undrawable left out
@@ -154,7 +167,11 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
 }
 
 TEST_F(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest) {
-  WriteCharacters({{"n1", Info("x")}, {"e1", Info("x")}, {"n2", Info("x")}, {"e2", Info("x")}, {"e3", Info("x")}});
+  WriteCharacters({{"n1", Info("x")},
+                   {"e1", Info("x")},
+                   {"n2", Info("x")},
+                   {"e2", Info("x")},
+                   {"e3", Info("x")}});
   emoji_ = {"e1", "e2", "e3"};
   const struct {
     std::uint64_t limit;
@@ -179,18 +196,23 @@ TEST_F(CharacterDatabaseTest, RelatedCharacters) {
     std::uint64_t limit;
     Strings expected;
   } kCases[] = {
-      {"a", 10, {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
+      {"a",
+       10,
+       {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
       {"A", 10, {"a", "á", "a"}},
       {"a", 1, {"A"}},
       {"a", 0, {}},
       {"a", std::uint64_t{1} << 63, {}},
-      {"👍🏽", 10, {"👍", "👍", "🏽", "👍", "🏽", "👍", "🏿"}},  // split by code point, pairs kept
+      {"👍🏽",
+       10,
+       {"👍", "👍", "🏽", "👍", "🏽", "👍", "🏿"}},  // split by code point, pairs kept
       {"👍🏽", 4, {"👍", "👍", "🏽", "👍"}},
       {"%", 10, {"q"}},  // escaped: only the row holding a real "%"
       {"_", 10, {"b"}},
       {"z", 10, {"x", "y"}},
   };
-  for (const auto& c : kCases) EXPECT_EQ(Related(c.text, c.limit), c.expected) << c.text << " " << c.limit;
+  for (const auto& c : kCases)
+    EXPECT_EQ(Related(c.text, c.limit), c.expected) << c.text << " " << c.limit;
   EXPECT_THAT(looked_up_, ElementsAre("RelatedCharDB"));
 }
 
@@ -210,8 +232,15 @@ TEST_F(CharacterDatabaseTest, InformationRecords) {
     const char* character;
     const char* unam;  // nullptr: no record
   } kCases[] = {
-      {"中", "middle"}, {"十五", nullptr}, {"十七", nullptr}, {"同", "same"}, {"无", nullptr},
-      {"👍🏽", "thumbs up"}, {"👍", "thumbs up"}, {"☝🏽", "index pointing up"}, {"☝", "index pointing up"},
+      {"中", "middle"},
+      {"十五", nullptr},
+      {"十七", nullptr},
+      {"同", "same"},
+      {"无", nullptr},
+      {"👍🏽", "thumbs up"},
+      {"👍", "thumbs up"},
+      {"☝🏽", "index pointing up"},
+      {"☝", "index pointing up"},
   };
   for (const auto& c : kCases) {
     MessageValue record = Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8(c.character));
@@ -237,13 +266,15 @@ TEST_F(CharacterDatabaseTest, InformationRecords) {
 
 TEST_F(CharacterDatabaseTest, SecondColumnWithALongNameHoldsNoRecord) {
   WriteCharacters({{"中", "middle" + std::string(15, '|')}}, "information");
-  EXPECT_TRUE(Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
+  EXPECT_TRUE(
+      Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
 }
 
 TEST_F(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAreNotReopened) {
   EXPECT_THAT(Search("heart", 10), ElementsAre("null"));
   EXPECT_THAT(Related("a", 10), ElementsAre());
-  EXPECT_TRUE(Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
+  EXPECT_TRUE(
+      Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
   // The stored handles are kept: files that appear later are not seen by this object.
   WriteCharacters({{"♥", Info("heart")}});
   EXPECT_THAT(Search("heart", 10), ElementsAre("null"));
@@ -258,7 +289,8 @@ TEST_F(CharacterDatabaseTest, LanguageListIsLoadedOnceFoundAndLookedForUntilThen
   };
   const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(list);
   std::ofstream(dir_.path() / "HanLanguageInfo.plist", std::ios::binary)
-      .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+      .write(reinterpret_cast<const char*>(bytes.data()),
+             static_cast<std::streamsize>(bytes.size()));
   EXPECT_EQ(Database().languageForFieldTag("jyom"), plist::Value("ja"));
   EXPECT_EQ(Database().tagsForLanguage("ja"), plist::Value(plist::Array{"jyom"}));
   EXPECT_FALSE(Database().languageForFieldTag("unam"));

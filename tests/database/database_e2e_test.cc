@@ -34,7 +34,8 @@ class DatabaseE2ETest : public ServiceTest {
     const MessageValue* result = reply->Find("result");
     return result ? *result : MessageValue();
   }
-  std::vector<std::string> Characters(const char* command, const std::string& text, std::uint64_t limit) {
+  std::vector<std::string> Characters(const char* command, const std::string& text,
+                                      std::uint64_t limit) {
     std::vector<std::string> characters;
     MessageValue result = Ask(command, text, limit);
     EXPECT_TRUE(result.is_array()) << result;
@@ -43,10 +44,11 @@ class DatabaseE2ETest : public ServiceTest {
     return characters;
   }
   void SetCountryPreference(const std::string& country) {
-    const std::filesystem::path path =
-        *PreferencesFilePath(".GlobalPreferences", kCFPreferencesAnyUser, kCFPreferencesCurrentHost);
+    const std::filesystem::path path = *PreferencesFilePath(
+        ".GlobalPreferences", kCFPreferencesAnyUser, kCFPreferencesCurrentHost);
     std::filesystem::create_directories(path.parent_path());
-    std::ofstream(path.string() + ".new") << plist::SerializeXmlPropertyList(plist::Dictionary{{"Country", country}});
+    std::ofstream(path.string() + ".new")
+        << plist::SerializeXmlPropertyList(plist::Dictionary{{"Country", country}});
     std::filesystem::rename(path.string() + ".new", path);
   }
 };

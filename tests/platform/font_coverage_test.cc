@@ -1,10 +1,11 @@
 // Font coverage with the fonts the project installs (Noto Color Emoji, DejaVu): only characters
 // whose coverage those packages settle are asked about.
+#include "platform/font_coverage.h"
+
 #include <gtest/gtest.h>
 
 #include <string>
 
-#include "platform/font_coverage.h"
 #include "text/utf8.h"
 
 namespace lumeris {
@@ -19,14 +20,15 @@ TEST(FontCoverageTest, EmojiFontAndDefaultLikeFont) {
   } kCases[] = {
       {"😀", true, true},
       {"❤", true, true},
-      {"❤\uFE0F", true, true},          // U+FE0F has no glyph, yet the pair is drawn
+      {"❤\uFE0F", true, true},  // U+FE0F has no glyph, yet the pair is drawn
       {"👍🏽", true, true},
-      {"👨\u200D👩\u200D👧", true, true},      // zero-width joiners
-      {"🏴\U000E0067\U000E0062\U000E0073\U000E0063\U000E0074\U000E007F", true, true},  // tag characters
+      {"👨\u200D👩\u200D👧", true, true},  // zero-width joiners
+      {"🏴\U000E0067\U000E0062\U000E0073\U000E0063\U000E0074\U000E007F", true,
+       true},  // tag characters
       {"a", false, true},
       {"é", false, true},
       {"a\uFE0F", false, true},
-      {"🦄a", false, false},     // no one font draws both
+      {"🦄a", false, false},  // no one font draws both
       {"\U0001FFFE", false, false},
   };
   for (const auto& c : kCases) {
