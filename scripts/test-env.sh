@@ -2,6 +2,8 @@
 # Source this file: starts a private D-Bus session bus and a virtual X server for the tests
 # and stops both when the sourcing shell exits. Never touches the user's own bus or display.
 lumeris_test_env_dir=$(mktemp -d /tmp/lumeris-test-env.XXXXXX)
+# Leaks inside system libraries that hold their state until the process ends (sanitizer build).
+export LSAN_OPTIONS=${LSAN_OPTIONS:-suppressions=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)/tests/lsan.supp}
 
 eval "$(dbus-daemon --session --fork --print-address=1 --print-pid=1 \
   --address="unix:path=$lumeris_test_env_dir/bus" | {

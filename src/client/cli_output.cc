@@ -61,11 +61,29 @@ std::string FormatCategory(const std::string& name, const MessageValue& entry) {
 
 }  // namespace
 
-std::string FormatCharacters(const MessageValue* result) {
+std::string ShortCharacterName(std::string_view names) {
+  names = names.substr(0, names.find("; "));
+  std::size_t words = 0;
+  for (std::size_t i = 0; i < names.size(); ++i) {
+    if (names[i] == ' ' && ++words == 6) return std::string(names.substr(0, i)) + " ...";
+  }
+  return std::string(names);
+}
+
+std::string FormatCharacters(const MessageValue* result,
+                             const std::map<std::string, std::string>* names) {
   std::string text;
   if (result == nullptr || !result->is_array()) return text;
   for (const MessageValue& element : *result->AsArray()) {
-    if (const std::string* character = element.AsString()) text += CharacterLine(*character);
+    const std::string* character = element.AsString();
+    if (character == nullptr) continue;
+    std::string line = CharacterLine(*character);
+    if (names != nullptr) {
+      if (auto name = names->find(*character); name != names->end() && !name->second.empty()) {
+        line.insert(line.size() - 1, "\t" + name->second);
+      }
+    }
+    text += line;
   }
   return text;
 }
@@ -75,10 +93,11 @@ std::string FormatCharacterInfo(std::string_view character, const MessageValue* 
   const MessageValue::Dictionary* fields = record ? record->AsDictionary() : nullptr;
   if (fields == nullptr || fields->empty()) return text;
   text += CharacterLine(character);
-  for (std::string_view tag : kCharacterInfoTags) {
-    const MessageValue* value = record->Find(tag);
+  for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
+    const MessageValue* value = record->Find(kCharacterInfoTags[i]);
     const std::string* field = value ? value->AsString() : nullptr;
-    text += std::string(tag) + "\t" + (field ? *field : std::string()) + "\n";
+    text += std::string(kCharacterInfoTags[i]) + "\t" + std::string(kCharacterInfoMeanings[i]) +
+            "\t" + (field ? *field : std::string()) + "\n";
   }
   for (const auto& [key, value] : *fields) {
     if (std::find(kCharacterInfoTags.begin(), kCharacterInfoTags.end(), key) !=
@@ -86,7 +105,7 @@ std::string FormatCharacterInfo(std::string_view character, const MessageValue* 
       continue;
     }
     const std::string* field = value.AsString();
-    text += key + "\t" + (field ? *field : JsonText(JsonFromMessageValue(value), false)) + "\n";
+    text += key + "\t\t" + (field ? *field : JsonText(JsonFromMessageValue(value), false)) + "\n";
   }
   return text;
 }

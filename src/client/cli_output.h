@@ -11,6 +11,7 @@
 #include <nlohmann/json.hpp>
 
 #include <array>
+#include <map>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -24,13 +25,27 @@ inline constexpr std::array<std::string_view, 16> kCharacterInfoTags = {
     "unam", "jyom", "krpi", "spin", "swbx", "swbh", "sbix", "cbai",
     "tcan", "tday", "tpin", "tzhu", "rsu1", "rsu2", "rsu3", "rsu4"};
 
-// One line per string element of a search result: the character, a tab, its code points.
-// Elements that are not strings are skipped; a value that is not an array prints nothing.
-std::string FormatCharacters(const MessageValue* result);
+// What each of the sixteen fields holds, parallel to kCharacterInfoTags.
+inline constexpr std::array<std::string_view, 16> kCharacterInfoMeanings = {
+    "names and keywords", "Japanese readings", "Korean reading",     "pinyin (mainland)",
+    "Wubi code",          "Wubi strokes",      "strokes (mainland)", "Cantonese (Jyutping)",
+    "Cangjie code",       "Dayi code",         "pinyin (Taiwan)",    "Zhuyin",
+    "radical-stroke 1",   "radical-stroke 2",  "radical-stroke 3",   "radical-stroke 4"};
+
+// The first words of a character's names (field "unam"): the text before the first "; ", cut
+// after six words.
+std::string ShortCharacterName(std::string_view names);
+
+// One line per string element of a search result: the character, a tab, its code points, and,
+// when `names` has one for the character, a tab and its name. Elements that are not strings are
+// skipped; a value that is not an array prints nothing.
+std::string FormatCharacters(const MessageValue* result,
+                             const std::map<std::string, std::string>* names = nullptr);
 
 // A character information record: a first line with the character and its code points, then
-// "<tag>\t<value>" for the sixteen tags in field order (a missing one shows as empty), then any
-// other keys the record holds. An empty or missing record prints nothing.
+// "<tag>\t<meaning>\t<value>" for the sixteen tags in field order (a missing one shows as empty),
+// then "<key>\t\t<value>" for any other keys the record holds. An empty or missing record prints
+// nothing.
 std::string FormatCharacterInfo(std::string_view character, const MessageValue* record);
 
 // One line per entity ID of a recents or favourites list (an array or null): the character, a

@@ -1,5 +1,6 @@
 #include "service/service_operations.h"
 
+#include "database/database_operations.h"
 #include "service/large_viewer.h"
 #include "store/store_operations.h"
 
@@ -10,6 +11,7 @@ namespace {
 ServiceOperations BuildInstalledOperations() {
   ServiceOperations operations;
   InstallStoreOperations(operations);
+  InstallDatabaseOperations(operations);
   operations.PrepareOpeningLargeVistrel = PrepareOpeningLargeVistrel;
   return operations;
 }

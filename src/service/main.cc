@@ -1,5 +1,10 @@
 // lumeris-fileservice: the file service. Serves until SIGTERM or SIGINT.
+#include "platform/font_coverage.h"
 #include "service/server.h"
 #include "service/service_handler.h"
 
-int main() { return lumeris::ServiceMain(lumeris::ServiceConnectionHandler); }
+int main() {
+  // The colour emoji font name must resolve before the first search asks about it.
+  lumeris::LoadLumerisFontConfiguration();
+  return lumeris::ServiceMain(lumeris::ServiceConnectionHandler);
+}

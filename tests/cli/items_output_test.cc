@@ -64,6 +64,12 @@ TEST(FormatListsTest, CharactersAndItemsOneLineEach) {
       "com.vantorel.Lumeris:<font>F<glyph>9<string>Z", "com.vantorel.lmk:{\"font\":\"F\"}", "opaque-token"])");
   EXPECT_EQ(FormatItems(&items),
             "😀\tU+1F600\tVantorelColorEmoji\nZ\tU+005A\tF\tglyph 9\n(no character)\t\tF\nopaque-token\t(opaque)\n");
+  const std::map<std::string, std::string> names = {
+      {"A", ShortCharacterName("LATIN CAPITAL LETTER A; a b")}};
+  EXPECT_EQ(FormatCharacters(&characters, &names),
+            "😀\tU+1F600\nA\tU+0041\tLATIN CAPITAL LETTER A\n");
+  EXPECT_EQ(ShortCharacterName("one two three four five six seven; x"),
+            "one two three four five six ...");
   const MessageValue null;
   EXPECT_EQ(FormatCharacters(&null), "");
   EXPECT_EQ(FormatCharacters(nullptr), "");
@@ -75,14 +81,15 @@ TEST(FormatCharacterInfoTest, PrintsTheSixteenTagsInFieldOrderThenOtherKeys) {
   std::string expected = "中\tU+4E2D\n";
   for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
     // Field 3 is missing and prints empty.
-    expected += std::string(kCharacterInfoTags[i]) + "\t" + (i == 3 ? "" : "v" + std::to_string(i)) + "\n";
+    expected += std::string(kCharacterInfoTags[i]) + "\t" + std::string(kCharacterInfoMeanings[i]) +
+                "\t" + (i == 3 ? "" : "v" + std::to_string(i)) + "\n";
   }
   // Set in reverse order so the output order cannot come from the dictionary.
   for (std::size_t i = kCharacterInfoTags.size(); i-- > 0;) {
     if (i != 3) record.Set(std::string(kCharacterInfoTags[i]), MessageValue::String("v" + std::to_string(i)));
   }
   record.Set("zzzz", MessageValue::String("extra"));
-  EXPECT_EQ(FormatCharacterInfo("中", &record), expected + "zzzz\textra\n");
+  EXPECT_EQ(FormatCharacterInfo("中", &record), expected + "zzzz\t\textra\n");
   const MessageValue empty = MessageValue::MakeDictionary();
   EXPECT_EQ(FormatCharacterInfo("中", &empty), "");
 }

@@ -1,7 +1,8 @@
 // The main() of every test program: before any test runs, point HOME and the XDG directories
 // at a sandbox inside the build tree, so no test can read or write the real user's
 // preferences, sockets or caches, and point LUMERIS_SYSTEM_ROOT at the bundles the build wrote
-// unless the caller chose another root. Child processes the tests start inherit all of it.
+// unless the caller chose another root, and LUMERIS_FONTCONFIG_FILE at the source tree's
+// fontconfig file. Child processes the tests start inherit all of it.
 //
 // Built with LUMERIS_TEST_PRIVATE_BUS, it also starts a D-Bus session bus for this process
 // alone (and the services its tests start), and stops it when the tests end.
@@ -38,6 +39,7 @@ void EnterSandbox() {
     setenv(entry.variable, dir.c_str(), 1);
   }
   setenv("LUMERIS_SYSTEM_ROOT", LUMERIS_TEST_SYSTEM_ROOT, 0);
+  setenv("LUMERIS_FONTCONFIG_FILE", LUMERIS_TEST_FONTCONFIG_FILE, 0);
 }
 
 #ifdef LUMERIS_TEST_PRIVATE_BUS

@@ -60,15 +60,6 @@ MessageValue Strings(std::initializer_list<std::string> strings) {
   return array;
 }
 
-// The first string of a search result, or `fallback`.
-std::string FirstResult(const std::optional<MessageValue>& reply, std::string fallback) {
-  const MessageValue* result = reply ? reply->Find("result") : nullptr;
-  if (result && result->is_array() && !result->AsArray()->empty()) {
-    if (const std::string* first = result->AsArray()->front().AsString()) return *first;
-  }
-  return fallback;
-}
-
 }  // namespace
 
 int RunDemo(CliSession& session) {
@@ -84,19 +75,18 @@ int RunDemo(CliSession& session) {
 
   Tour tour(session);
   MessageValue search = CommandRequest("search_matched_chars");
-  search.Set("string", MessageValue::String("smiling"));
+  search.Set("string", MessageValue::String("heart"));
   search.Set("limit", MessageValue::Uint64(5));
-  std::optional<MessageValue> found = tour.Show(
-      "Search \"smiling\" (at most 5):", search,
-      [](const MessageValue& reply) { return FormatCharacters(reply.Find("result")); });
-
-  const std::string character = FirstResult(found, "中");
-  MessageValue related = CommandRequest("search_related_chars");
-  related.Set("string", MessageValue::String(character));
-  related.Set("limit", MessageValue::Uint64(5));
-  tour.Show("Related to " + character + " (at most 5):", related,
+  tour.Show("Search \"heart\" (at most 5):", search,
             [](const MessageValue& reply) { return FormatCharacters(reply.Find("result")); });
 
+  MessageValue related = CommandRequest("search_related_chars");
+  related.Set("string", MessageValue::String("a"));
+  related.Set("limit", MessageValue::Uint64(12));
+  tour.Show("Related to a (at most 12):", related,
+            [](const MessageValue& reply) { return FormatCharacters(reply.Find("result")); });
+
+  const std::string character = "中";
   MessageValue info = CommandRequest("search_character_info");
   info.Set("string", MessageValue::String(character));
   tour.Show("Information about " + character + ":", info, [&](const MessageValue& reply) {

@@ -1,6 +1,7 @@
 #include "client/commands/search_commands.h"
 
 #include <cstdint>
+#include <map>
 #include <memory>
 #include <string>
 #include <vector>
@@ -35,27 +36,52 @@ struct CharacterQuery {
   bool has_limit;
   const char* example;
   // The human form of the reply's "result" (empty when there is nothing) and what to say then.
-  std::string (*format)(const SearchOptions& options, const MessageValue* result);
+  std::string (*format)(CliSession& session, const SearchOptions& options,
+                        const MessageValue* result);
   const char* when_empty;
 };
 
-std::string FormatFoundCharacters(const SearchOptions&, const MessageValue* result) {
-  return FormatCharacters(result);
+// The first words of each found character's name, asked of the service one character at a time;
+// a character whose record does not come is shown without a name.
+std::map<std::string, std::string> CharacterNames(CliSession& session, const MessageValue* result) {
+  std::map<std::string, std::string> names;
+  if (result == nullptr || !result->is_array()) return names;
+  for (const MessageValue& element : *result->AsArray()) {
+    const std::string* character = element.AsString();
+    if (character == nullptr || names.count(*character)) continue;
+    MessageValue request = CommandRequest("search_character_info");
+    request.Set("string", MessageValue::String(*character));
+    std::optional<MessageValue> reply =
+        session.Ask("info", request, session.timeout(), /*quiet=*/true);
+    const MessageValue* record = reply ? reply->Find("result") : nullptr;
+    const std::string* unam = record ? record->GetString("unam") : nullptr;
+    names[*character] = unam ? ShortCharacterName(*unam) : std::string();
+  }
+  return names;
 }
 
-std::string FormatInformation(const SearchOptions& options, const MessageValue* result) {
+std::string FormatFoundCharacters(CliSession& session, const SearchOptions&,
+                                  const MessageValue* result) {
+  const std::map<std::string, std::string> names = CharacterNames(session, result);
+  return FormatCharacters(result, &names);
+}
+
+std::string FormatInformation(CliSession&, const SearchOptions& options,
+                              const MessageValue* result) {
   return FormatCharacterInfo(options.text, result);
 }
 
 constexpr CharacterQuery kCharacterQueries[] = {
-    {"search", "search_matched_chars", "Characters whose name contains TEXT, with code points",
-     "text", "the text to look for in character names", true,
-     "lumeris search 'smiling face' --limit 5", &FormatFoundCharacters, "no characters found"},
-    {"related", "search_related_chars", "Characters related to CHAR, with code points",
+    {"search", "search_matched_chars",
+     "Characters whose name contains TEXT, with code points and names", "text",
+     "the text to look for in character names", true, "lumeris search 'smiling face' --limit 5",
+     &FormatFoundCharacters, "no characters found"},
+    {"related", "search_related_chars", "Characters related to CHAR, with code points and names",
      "character", "the character", true, "lumeris related 中 --limit 10", &FormatFoundCharacters,
      "no related characters"},
-    {"info", "search_character_info", "The sixteen information fields of CHAR, in field order",
-     "character", "the character", false, "lumeris info 中", &FormatInformation,
+    {"info", "search_character_info",
+     "The sixteen information fields of CHAR, in field order, with what each holds", "character",
+     "the character", false, "lumeris info 中", &FormatInformation,
      "no information about this character"},
 };
 
@@ -77,7 +103,7 @@ void AddCharacterQuery(CLI::App& app, CliSession& session, const CharacterQuery&
     if (session.json()) {
       session.PrintJson(ReplyJson(*reply));
     } else {
-      session.PrintLines(query.format(*options, reply->Find("result")), query.when_empty);
+      session.PrintLines(query.format(session, *options, reply->Find("result")), query.when_empty);
     }
   });
 }
