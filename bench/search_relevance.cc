@@ -87,7 +87,8 @@ int Main(int argc, char** argv) {
   if (mkdtemp(runtime) == nullptr) return 1;
   setenv("XDG_RUNTIME_DIR", runtime, 1);
   if (getenv("LUMERIS_FILESERVICE") == nullptr) setenv("LUMERIS_FILESERVICE", LUMERIS_BENCH_FILESERVICE, 1);
-  if (getenv("LUMERIS_SYSTEM_ROOT") == nullptr) setenv("LUMERIS_SYSTEM_ROOT", LUMERIS_BENCH_SYSTEM_ROOT, 1);
+  setenv("LUMERIS_SYSTEM_ROOT", LUMERIS_BENCH_SYSTEM_ROOT, 0);
+  setenv("LUMERIS_FONTCONFIG_FILE", LUMERIS_BENCH_FONTCONFIG_FILE, 0);
 
   std::string error;
   std::unique_ptr<ServiceClient> client = ServiceClient::Connect({}, &error);
