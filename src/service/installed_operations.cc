@@ -1,5 +1,6 @@
 #include "service/service_operations.h"
 
+#include "categories/category_catalogue.h"
 #include "service/large_viewer.h"
 #include "store/store_operations.h"
 
@@ -11,6 +12,7 @@ ServiceOperations BuildInstalledOperations() {
   ServiceOperations operations;
   InstallStoreOperations(operations);
   operations.PrepareOpeningLargeVistrel = PrepareOpeningLargeVistrel;
+  operations.CreateXPCCategoryDataArray = CreateXPCCategoryDataArray;
   return operations;
 }
 

@@ -13,7 +13,7 @@
 #include <vector>
 
 #include "platform/property_list_io.h"
-#include "resource_builder/data_notation.h"
+#include "categories/data_notation.h"
 
 namespace lumeris::resources {
 namespace {
