@@ -110,13 +110,18 @@ std::string FormatEntry(const std::string& name, const MessageValue& entry, std:
   return text;
 }
 
-// A file name made of `name`'s letters, digits, "-" and "_" (others become "_").
+// A file name made of `name`'s ASCII letters, digits, "-" and "_"; each run of other bytes
+// becomes one "_".
 std::string SafeFileName(std::string_view name) {
   std::string safe;
   for (char c : name) {
     const bool plain = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '-' ||
                        c == '_';
-    safe += plain ? c : '_';
+    if (plain) {
+      safe += c;
+    } else if (safe.empty() || safe.back() != '_') {
+      safe += '_';
+    }
   }
   return safe.empty() ? "_" : safe;
 }

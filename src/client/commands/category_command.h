@@ -8,7 +8,8 @@
 //   notation (the emoji category: one block per sub-category).
 // - --icons DIR writes every icon the reply holds to DIR as a file a viewer opens (".pdf" or
 //   ".tiff", told by the bytes): "<name>.pdf", and "<name>-<n>-<title>.pdf" for the emoji
-//   sub-categories; characters other than letters, digits, "-" and "_" become "_".
+//   sub-categories; each run of characters other than ASCII letters, digits, "-" and "_" becomes
+//   one "_".
 // - --json: with names, the reply; without, {"groups": [{"group", "categories": [{"name",
 //   "title", "characters"}]}]}.
 //
