@@ -47,12 +47,42 @@ MessageValue::Bytes ReadFileBytes(const std::filesystem::path& path) {
   return bytes;
 }
 
+// The plain resource lookup of one bundle (the non-localized folder, then the user's preferred
+// localizations, then the development localization), with that order worked out once per request:
+// choosing the preferred localizations runs ICU's matcher over every localization of the bundle,
+// which would otherwise happen again for every icon that is not found in the first place tried.
+class PlainLookup {
+ public:
+  explicit PlainLookup(const Bundle* bundle) : bundle_(bundle) {
+    if (bundle_ == nullptr) return;
+    order_ = bundle_->PreferredLocalizations();
+    const auto& development = bundle_->development_localization();
+    if (development && std::find(order_.begin(), order_.end(), *development) == order_.end()) {
+      order_.push_back(*development);
+    }
+  }
+
+  std::optional<std::filesystem::path> PathForResource(std::string_view name, std::string_view type) const {
+    if (bundle_ == nullptr) return std::nullopt;
+    // Without any localization to try, only the non-localized folder is searched.
+    if (order_.empty()) return bundle_->PathForResource(name, type);
+    // Each call looks in the non-localized folder first, then in the one localization.
+    for (const std::string& localization : order_) {
+      if (auto path = bundle_->PathForResource(name, type, {}, localization)) return path;
+    }
+    return std::nullopt;
+  }
+
+ private:
+  const Bundle* bundle_;
+  std::vector<std::string> order_;
+};
+
 // The first file found for `name` trying, for "tiff" and then "pdf", each bundle in order;
 // its bytes, or zero bytes when there is none.
-MessageValue IconData(std::string_view name, std::initializer_list<const Bundle*> bundles) {
+MessageValue IconData(std::string_view name, std::initializer_list<const PlainLookup*> bundles) {
   for (std::string_view type : {"tiff", "pdf"}) {
-    for (const Bundle* bundle : bundles) {
-      if (bundle == nullptr) continue;
+    for (const PlainLookup* bundle : bundles) {
       if (const auto path = bundle->PathForResource(name, type)) {
         return MessageValue::Data(ReadFileBytes(*path));
       }
@@ -81,8 +111,8 @@ std::optional<plist::Value> SymbolsGroupCategories(const Bundle* application, st
 
 // The "Data" array of the emoji category: one sub-entry per "EmojiDataArray" dictionary of
 // "Category-Emoji" (a plain lookup, no localization).
-MessageValue EmojiSubcategories(const Bundle* application, const Bundle* framework,
-                                const std::string& localization) {
+MessageValue EmojiSubcategories(const Bundle* application, const PlainLookup& application_lookup,
+                                const PlainLookup& framework_lookup, const std::string& localization) {
   MessageValue subcategories = MessageValue::MakeArray();
   const std::optional<plist::Dictionary> emoji =
       LoadDictionaryPlist(application, "Category-Emoji", std::nullopt);
@@ -102,7 +132,8 @@ MessageValue EmojiSubcategories(const Bundle* application, const Bundle* framewo
     entry.Set("TitleText", MessageValue::String(std::move(title)));
 
     const std::string* image = FindString(subcategory, "VTCategoryImage");
-    entry.Set("TitleImage", image ? IconData(*image, {framework, application}) : MessageValue::Data({}));
+    entry.Set("TitleImage",
+              image ? IconData(*image, {&framework_lookup, &application_lookup}) : MessageValue::Data({}));
 
     const plist::Value* category_data = subcategory.Find("VTCategoryData");
     const std::string* data = category_data ? FindString(*category_data, "Data") : nullptr;
@@ -165,10 +196,12 @@ MessageValue CreateCategoryDataArrayFromBundles(const StringList& names, const B
   // neither filtered nor reordered by what the plist offers.
   [[maybe_unused]] const std::optional<plist::Value> offered = SymbolsGroupCategories(application, localization);
   if (!names) return result;
+  const PlainLookup application_lookup(application);
+  const PlainLookup framework_lookup(framework);
   for (const std::string& name : *names) {
     MessageValue entry = MessageValue::MakeDictionary();
     if (name == kEmojiCategoryName) {
-      entry.Set("Data", EmojiSubcategories(application, framework, localization));
+      entry.Set("Data", EmojiSubcategories(application, application_lookup, framework_lookup, localization));
     } else {
       SetOrdinaryCategoryData(application, name, localization, entry);
     }
@@ -176,7 +209,7 @@ MessageValue CreateCategoryDataArrayFromBundles(const StringList& names, const B
                                LocalizedStringForLanguage("CategoryName-" + name, application,
                                                           localization, std::nullopt, name)
                                    .value_or(name)));
-    entry.Set("TitleImage", IconData("CategoryImage-" + name, {application}));
+    entry.Set("TitleImage", IconData("CategoryImage-" + name, {&application_lookup}));
     result.Append(std::move(entry));
   }
   return result;
