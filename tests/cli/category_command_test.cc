@@ -118,11 +118,6 @@ TEST_F(CategoryCommandTest, WithoutNamesListsTheOfferedCategoriesByGroup) {
   EXPECT_EQ(*channel_.requests[0].Find("categories"),
             MessageValue::MakeArray({MessageValue::String("Emoji"), MessageValue::String("Arrows"),
                                      MessageValue::String("Greek")}));
-
-  ASSERT_EQ(run({"categories", "--json"}), 0) << err_.str();
-  const nlohmann::json json = nlohmann::json::parse(out_.str());
-  EXPECT_EQ(json["groups"][1], nlohmann::json::parse(R"({"group": "CategoryGroup-Letters",
-      "categories": [{"name": "Greek", "title": "Greek letters", "characters": 3}]})"));
 }
 
 TEST_F(CategoryCommandTest, IconsAreWrittenAsFilesOfTheirType) {
@@ -137,19 +132,6 @@ TEST_F(CategoryCommandTest, IconsAreWrittenAsFilesOfTheirType) {
   // A directory that cannot be made is an unusable argument.
   EXPECT_EQ(run({"categories", "Arrows", "--icons", (dir / "Arrows.pdf" / "x").string()}), kExitBadArgument);
   EXPECT_NE(err_.str().find("cannot create"), std::string::npos) << err_.str();
-}
-
-TEST(FormatCategoryEntriesTest, LongDataWrapsAndIsCutOnlyWhenAsked) {
-  MessageValue entry = MessageValue::MakeDictionary();
-  entry.Set("Data", MessageValue::String("0041-0062"));  // A to b: 34 characters
-  MessageValue odd = MessageValue::MakeDictionary();
-  odd.Set("Data", MessageValue::String("A,B"));
-  const MessageValue result = MessageValue::MakeArray({entry, odd});
-  const std::string all = FormatCategoryEntries({"Long", "Odd"}, &result);
-  EXPECT_NE(all.find("  A B C D E F G H I J K L M N O P Q R S T U V W X Y Z [ \\ ] ^ _ `\n  a b\n"),
-            std::string::npos) << all;
-  EXPECT_NE(all.find("  A,B\t(not in the Data notation)\n"), std::string::npos) << all;
-  EXPECT_NE(FormatCategoryEntries({"Long"}, &result, 3).find("\n  A B C ...\n"), std::string::npos);
 }
 
 }  // namespace
