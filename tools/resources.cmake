@@ -7,7 +7,6 @@ set(LUMERIS_RESOURCE_BUILDER_SOURCES
   resource_builder/character_info.cc
   resource_builder/cldr_annotations.cc
   resource_builder/cldr_labels.cc
-  resource_builder/data_notation.cc
   resource_builder/emoji_test.cc
   resource_builder/han_language_info.cc
   resource_builder/icons.cc
@@ -27,7 +26,7 @@ function(lumeris_add_resource_builder_library name)
   add_library(${name} STATIC ${LUMERIS_RESOURCE_BUILDER_SOURCES})
   target_include_directories(${name} PUBLIC ${CMAKE_CURRENT_SOURCE_DIR})
   target_link_libraries(${name}
-    PUBLIC lumeris_plist lumeris_config SQLite::SQLite3
+    PUBLIC lumeris_plist lumeris_config lumeris_data_notation SQLite::SQLite3
     PRIVATE ICU::uc pugixml::pugixml BZip2::BZip2 PkgConfig::CAIRO PkgConfig::PANGO Threads::Threads)
 endfunction()
 

@@ -9,6 +9,7 @@ add_library(lumeris_cli STATIC
   ${CMAKE_CURRENT_LIST_DIR}/cli_json_value.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_output.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_session.cc
+  ${CMAKE_CURRENT_LIST_DIR}/commands/category_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/demo_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/raw_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/search_commands.cc
@@ -16,7 +17,7 @@ add_library(lumeris_cli STATIC
   ${CMAKE_CURRENT_LIST_DIR}/commands/viewer_command.cc)
 target_link_libraries(lumeris_cli
   PUBLIC lumeris_client lumeris_config CLI11::CLI11 nlohmann_json::nlohmann_json
-  PRIVATE lumeris lumeris_cli_prefs)  # lumeris_cli_prefs: the defaults and watch subcommands
+  PRIVATE lumeris lumeris_cli_prefs lumeris_categories lumeris_data_notation ICU::uc)  # lumeris_cli_prefs: the defaults and watch subcommands
 
 add_executable(lumeris_cli_program ${CMAKE_CURRENT_LIST_DIR}/main.cc)
 target_link_libraries(lumeris_cli_program PRIVATE lumeris_cli)

@@ -1,5 +1,6 @@
 #include "client/cli_app.h"
 
+#include "client/commands/category_command.h"
 #include "client/commands/demo_command.h"
 #include "client/commands/raw_command.h"
 #include "client/commands/search_commands.h"
@@ -16,7 +17,8 @@ constexpr char kExamples[] = R"(Examples:
   lumeris search 'smiling face' --limit 5      characters and their code points
   lumeris related 中 --limit 10                 related characters
   lumeris info 中                               the sixteen information fields
-  lumeris categories Emoji                      category titles, icons and characters
+  lumeris categories                            the categories offered, with titles and counts
+  lumeris categories Emoji --icons /tmp/icons   category titles, icons and characters
   lumeris recents                               the recents list, as characters
   lumeris recents add 👍🏽 --emoji-font           put an emoji at the front
   lumeris recents set A B C                     replace the list (no items: remove it)
@@ -53,6 +55,7 @@ void BuildCliApp(CLI::App& app, CliSession& session) {
   app.footer(kExamples);
 
   AddSearchCommands(app, session);
+  AddCategoryCommand(app, session);
   AddStoreCommands(app, session);
   AddViewerCommand(app, session);
   AddRawCommand(app, session);

@@ -8,9 +8,6 @@
 namespace lumeris::cli {
 namespace {
 
-// Characters of a category's data shown before the rest is summarised.
-constexpr std::size_t kCategoryPreviewCharacters = 40;
-
 std::string CharacterLine(std::string_view character) {
   return std::string(character) + "\t" + CodePoints(character) + "\n";
 }
@@ -23,40 +20,6 @@ nlohmann::json PayloadJson(const MessageValue& value) {
     if (!parsed.is_discarded()) return parsed;
   }
   return JsonFromMessageValue(value);
-}
-
-// The first kCategoryPreviewCharacters scalar values of UTF-8 text, then " ..." when there is
-// more.
-std::string Preview(std::string_view text) {
-  std::size_t scalars = 0;
-  std::size_t i = 0;
-  for (; i < text.size(); ++i) {
-    if ((static_cast<unsigned char>(text[i]) & 0xC0) == 0x80) continue;
-    if (scalars++ == kCategoryPreviewCharacters) break;
-  }
-  return i < text.size() ? std::string(text.substr(0, i)) + " ..." : std::string(text);
-}
-
-std::string FormatCategory(const std::string& name, const MessageValue& entry) {
-  std::string text = name;
-  if (const std::string* title = entry.GetString("TitleText")) text += "\t" + *title;
-  if (const MessageValue::Bytes* image = entry.GetData("TitleImage")) {
-    text += "\t(icon " + std::to_string(image->size()) + " bytes)";
-  }
-  text += "\n";
-  const MessageValue* data = entry.Find("Data");
-  if (data == nullptr) return text;
-  if (const std::string* characters = data->AsString()) {
-    text += "  " + Preview(*characters) + "\n";
-  } else if (const MessageValue::Array* subcategories = data->AsArray()) {
-    for (const MessageValue& subcategory : *subcategories) {
-      const std::string* title = subcategory.GetString("TitleText");
-      const std::string* characters = subcategory.GetString("Data");
-      text += "  " + (title ? *title : std::string("?")) + "\t" +
-              (characters ? Preview(*characters) : std::string()) + "\n";
-    }
-  }
-  return text;
 }
 
 }  // namespace
@@ -127,16 +90,6 @@ std::string FormatItems(const MessageValue* list) {
     if (item.font) line += "\t" + *item.font;
     if (item.glyph) line += "\tglyph " + std::to_string(*item.glyph);
     text += line + "\n";
-  }
-  return text;
-}
-
-std::string FormatCategories(const std::vector<std::string>& names, const MessageValue* result) {
-  std::string text;
-  if (result == nullptr || !result->is_array()) return text;
-  const MessageValue::Array& entries = *result->AsArray();
-  for (std::size_t i = 0; i < entries.size(); ++i) {
-    text += FormatCategory(i < names.size() ? names[i] : "?", entries[i]);
   }
   return text;
 }

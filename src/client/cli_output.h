@@ -53,11 +53,6 @@ std::string FormatCharacterInfo(std::string_view character, const MessageValue* 
 // an entity ID prints as it is, marked "(opaque)".
 std::string FormatItems(const MessageValue* list);
 
-// The category entries of a "read_categorydata" result, paired with the names asked for: the
-// name and title, the size of the icon, then the characters (ordinary categories) or one
-// indented line per sub-category (the emoji category).
-std::string FormatCategories(const std::vector<std::string>& names, const MessageValue* result);
-
 // A "read_recents_favorites" reply: recents and favourites as FormatItems() under headings,
 // then the skin-tone history and the state as compact JSON.
 std::string FormatReadAll(const MessageValue& reply);

@@ -1,5 +1,6 @@
 #include "service/service_operations.h"
 
+#include "categories/category_catalogue.h"
 #include "database/database_operations.h"
 #include "service/large_viewer.h"
 #include "store/store_operations.h"
@@ -13,6 +14,7 @@ ServiceOperations BuildInstalledOperations() {
   InstallStoreOperations(operations);
   InstallDatabaseOperations(operations);
   operations.PrepareOpeningLargeVistrel = PrepareOpeningLargeVistrel;
+  operations.CreateXPCCategoryDataArray = CreateXPCCategoryDataArray;
   return operations;
 }
 

@@ -94,23 +94,6 @@ TEST(FormatCharacterInfoTest, PrintsTheSixteenTagsInFieldOrderThenOtherKeys) {
   EXPECT_EQ(FormatCharacterInfo("中", &empty), "");
 }
 
-TEST(FormatCategoriesTest, OrdinaryAndEmojiEntriesAndLongDataCut) {
-  const MessageValue result = Json(R"([
-      {"Data": "←,→", "TitleText": "Arrows", "TitleImage": {"$data": "AQID"}},
-      {"Data": [{"TitleText": "Smileys", "Data": "<emoji>😀"}], "TitleText": "Emoji"}])");
-  EXPECT_EQ(FormatCategories({"Arrows", "Emoji"}, &result),
-            "Arrows\tArrows\t(icon 3 bytes)\n  ←,→\nEmoji\tEmoji\n  Smileys\t<emoji>😀\n");
-
-  std::string data;
-  for (int i = 0; i < 100; ++i) data += "é";
-  MessageValue entry = MessageValue::MakeDictionary();
-  entry.Set("Data", MessageValue::String(data));
-  const MessageValue long_result = MessageValue::MakeArray({entry});
-  const std::string text = FormatCategories({"Long"}, &long_result);
-  EXPECT_EQ(text.find(data), std::string::npos);
-  EXPECT_NE(text.find(" ...\n"), std::string::npos) << text;
-}
-
 TEST(ReadAllOutputTest, HumanAndJsonFormsShowThePayloadsAsJson) {
   MessageValue reply = Json(R"({"recents": ["com.vantorel.lmk:{\"char\":\"A\"}"], "favorites": null})");
   reply.Set("state", MessageValue::DataFromBytes(R"({"VTGlobalEmojiDiversityDescribed":true})"));

@@ -15,8 +15,8 @@
 #include <vector>
 
 #include "platform/property_list_io.h"
+#include "categories/data_notation.h"
 #include "text/replacement_dictionary.h"
-#include "resource_builder/data_notation.h"
 
 namespace lumeris::resources {
 namespace {

@@ -7,7 +7,6 @@
 #include "resource_builder/character_info.h"
 #include "resource_builder/cldr_annotations.h"
 #include "resource_builder/cldr_labels.h"
-#include "resource_builder/data_notation.h"
 #include "resource_builder/emoji_test.h"
 #include "resource_builder/related_chars.h"
 #include "resource_builder/ucd_format.h"
@@ -258,38 +257,6 @@ TEST(HanVariantGroupsTest, UnitesVariantsTransitively) {
                    kUnihanFieldsUsed, table);
   std::vector<std::u32string> groups = HanVariantGroups(table);
   EXPECT_EQ(groups, (std::vector<std::u32string>{U"发發髮", U"水氵"}));
-}
-
-TEST(DataNotationTest, RoundTripsEveryKindOfCharacter) {
-  const std::vector<std::u32string> characters = {
-      U"A", U"B", U"C", U"D",                   // a run becomes a range
-      U",",                                     // the separator itself
-      U"e\u0301",                               // a letter with a combining mark
-      U"\u0301",                                // a lone combining mark
-      U"\U0001F44D\U0001F3FD",                  // skin-tone sequence
-      U"\U0001F1E9\U0001F1EA",                  // flag
-      U"#\uFE0F\u20E3",                         // keycap
-      U"\U0001F468\u200D\U0001F469\u200D\U0001F467",  // family
-      U"\U00010000", U"\U0010FFFD",
-  };
-  std::string data = FormatDataString(characters);
-  EXPECT_EQ(data.find_first_not_of("0123456789ABCDEF,+-"), std::string::npos) << data;
-  EXPECT_EQ(ParseDataString(data), characters);
-}
-
-TEST(DataNotationTest, JoinedStringsDenoteTheConcatenation) {
-  std::vector<std::u32string> first = {U"a", U"b"}, second = {U"\U0001F600", U"c\u0327"};
-  std::vector<std::u32string> both = first;
-  both.insert(both.end(), second.begin(), second.end());
-  EXPECT_EQ(ParseDataString(FormatDataString(first) + "," + FormatDataString(second)), both);
-}
-
-TEST(DataNotationTest, RejectsMalformedStrings) {
-  for (const char* data : {"41", "0041,", ",0041", "0041--0042", "0042-0041", "0041++0042", "00g1", "0041 0042",
-                           "D800", "110000", "0041+"}) {
-    EXPECT_FALSE(ParseDataString(data)) << data;
-  }
-  EXPECT_EQ(ParseDataString(""), std::vector<std::u32string>{});
 }
 
 TEST(InfoFieldsTest, AlwaysSixteenFieldsWhateverTheText) {

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "resource_builder/data_notation.h"
+#include "categories/data_notation.h"
 
 namespace lumeris::resources {
 

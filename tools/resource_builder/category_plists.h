@@ -2,7 +2,7 @@
 //  - "Categories":     {"VTAvailableCategories": [{"Group": "CategoryGroup-Symbols", "Categories": [names]}, ...]}
 //  - "Category-<name>": {"VTCategoryData": {"DataArray": [{"Data": "...", "VTSkipNullGlyphs": true?}, ...]}}
 //  - "Category-Emoji":  {"EmojiDataArray": [{"VTDataTitle", "VTCategoryImage", "VTCategoryData": {"Data"}}, ...]}
-// Data strings use the notation of data_notation.h.
+// Data strings use the notation of categories/data_notation.h.
 //
 // Thread-safety: pure functions. Values belong to the caller.
 #pragma once

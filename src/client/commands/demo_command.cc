@@ -7,6 +7,7 @@
 
 #include "client/cli_items.h"
 #include "client/cli_output.h"
+#include "client/commands/category_command.h"
 #include "service/socket_path.h"
 
 namespace lumeris::cli {
@@ -94,10 +95,11 @@ int RunDemo(CliSession& session) {
   });
 
   MessageValue categories = CommandRequest("read_categorydata");
-  categories.Set("categories", Strings({"Emoji"}));
-  tour.Show("The Emoji category:", categories, [](const MessageValue& reply) {
-    return FormatCategories({"Emoji"}, reply.Find("result"));
-  });
+  categories.Set("categories", Strings({"Arrows", "Emoji"}));
+  tour.Show("The Arrows and Emoji categories (the first 12 characters of each):", categories,
+            [](const MessageValue& reply) {
+              return FormatCategoryEntries({"Arrows", "Emoji"}, reply.Find("result"), 12);
+            });
 
   session.out() << "\nUser data, under the storage identifier " << kDemoIdentifier << ":\n";
   const ItemOptions emoji{.emoji_font = true};

@@ -112,25 +112,6 @@ void AddCharacterQuery(CLI::App& app, CliSession& session, const CharacterQuery&
 
 void AddSearchCommands(CLI::App& app, CliSession& session) {
   for (const CharacterQuery& query : kCharacterQueries) AddCharacterQuery(app, session, query);
-
-  auto names = std::make_shared<std::vector<std::string>>();
-  CLI::App* categories = app.add_subcommand(
-      "categories", "Titles, icons and characters of the categories NAME...");
-  categories->add_option("names", *names, "category names, e.g. Emoji")->required();
-  categories->footer("Example: lumeris categories Emoji");
-  categories->callback([&session, names] {
-    MessageValue request = CommandRequest("read_categorydata");
-    MessageValue array = MessageValue::MakeArray();
-    for (const std::string& name : *names) array.Append(MessageValue::String(name));
-    request.Set("categories", std::move(array));
-    std::optional<MessageValue> reply = session.Ask("categories", request);
-    if (!reply) ExitWith(kExitNoAnswer);
-    if (session.json()) {
-      session.PrintJson(ReplyJson(*reply));
-    } else {
-      session.PrintLines(FormatCategories(*names, reply->Find("result")), "no categories");
-    }
-  });
 }
 
 }  // namespace lumeris::cli

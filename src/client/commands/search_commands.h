@@ -2,7 +2,6 @@
 //   search TEXT [--limit N]    "search_matched_chars"
 //   related CHAR [--limit N]   "search_related_chars"
 //   info CHAR                  "search_character_info"
-//   categories NAME...         "read_categorydata"
 //
 // Thread-safety: the registered callbacks run on the thread that parses the command line.
 #pragma once
@@ -13,7 +12,7 @@
 
 namespace lumeris::cli {
 
-// Adds the four subcommands to `app`; they talk through `session`, which must outlive `app`.
+// Adds the three subcommands to `app`; they talk through `session`, which must outlive `app`.
 void AddSearchCommands(CLI::App& app, CliSession& session);
 
 }  // namespace lumeris::cli

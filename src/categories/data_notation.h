@@ -9,6 +9,9 @@
 // can be confused with the separators, and two Data strings joined with "," form a valid Data
 // string again. docs/resources.md describes it for panel authors.
 //
+// The resource builder writes Data strings with FormatDataString(); the lumeris command (and the
+// panel) read them back with ParseDataString(). The catalogue itself passes them through untouched.
+//
 // Thread-safety: pure functions; results belong to the caller.
 #pragma once
 
@@ -17,7 +20,7 @@
 #include <string_view>
 #include <vector>
 
-namespace lumeris::resources {
+namespace lumeris {
 
 // The Data string of `characters` in the given order; runs of three or more consecutive single
 // code points become ranges.
@@ -27,4 +30,4 @@ std::string FormatDataString(const std::vector<std::u32string>& characters);
 // (an empty string denotes no characters).
 std::optional<std::vector<std::u32string>> ParseDataString(std::string_view data);
 
-}  // namespace lumeris::resources
+}  // namespace lumeris

@@ -1,8 +1,8 @@
-#include "resource_builder/data_notation.h"
+#include "categories/data_notation.h"
 
 #include <cstdio>
 
-namespace lumeris::resources {
+namespace lumeris {
 namespace {
 
 void AppendHex(char32_t cp, std::string& out) {
@@ -90,4 +90,4 @@ std::optional<std::vector<std::u32string>> ParseDataString(std::string_view data
   return characters;
 }
 
-}  // namespace lumeris::resources
+}  // namespace lumeris
