@@ -73,7 +73,7 @@ PixelBox ToPixels(Rect rect, double scale) {
   const double right = std::ceil((rect.x + rect.width) * scale);
   const double bottom = std::ceil((rect.y + rect.height) * scale);
   // Far beyond any X window (coordinates are 16-bit); keeps the conversions below defined.
-  constexpr double kLimit = 1 << 20;
+  static constexpr double kLimit = 1 << 20;
   const auto clamp = [](double v) { return static_cast<int>(std::clamp(v, -kLimit, kLimit)); };
   return {clamp(left), clamp(top), clamp(right) - clamp(left), clamp(bottom) - clamp(top)};
 }

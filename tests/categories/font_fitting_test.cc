@@ -85,7 +85,9 @@ TEST(FontFittingTest, OnlyOneGlyphOrAGlyphWithAVariationSelectorFits) {
     SCOPED_TRACE(c.text);
     Fitted fitted = Fit(c.text, c.font, {0, 0, 40, 40});
     EXPECT_EQ(fitted.font != nullptr, c.fits);
-    if (!c.fits) EXPECT_EQ(fitted.glyph_rect, (Rect{-1, -1, -1, -1}));  // left untouched
+    if (!c.fits) {
+      EXPECT_EQ(fitted.glyph_rect, (Rect{-1, -1, -1, -1}));  // left untouched
+    }
   }
   // The variation selector changes nothing: same glyph, same size, same rectangle.
   Fitted plain = Fit("A", "DejaVu Sans 100", {0, 0, 40, 40});

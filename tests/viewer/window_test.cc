@@ -71,7 +71,9 @@ TEST_F(WindowCaptureTest, EmptyRectangleGivesTheWholeWindow) {
   for (const Rect empty : {Rect{}, Rect{5, 5, 0, 10}, Rect{5, 5, 10, -1}}) {
     cairo_surface_t* picture = CacheWindowContentsImage(connection(), window_, empty);
     ExpectShows(picture, 0, 0, kWidth, kHeight);
-    if (empty == Rect{}) EXPECT_TRUE(testing::WritePicture(picture, "captured_window"));
+    if (empty == Rect{}) {
+      EXPECT_TRUE(testing::WritePicture(picture, "captured_window"));
+    }
     cairo_surface_destroy(picture);
   }
 }
