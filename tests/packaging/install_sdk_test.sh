@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # install_sdk_test.sh <build dir> <example source dir>
-# Installs the build into a fresh prefix and builds the panel example against it twice: with
+# Installs the build's panel-sdk component (liblumeris, its headers, lumeris.pc, the CMake
+# package) into a fresh prefix and builds the panel example against it twice: with
 # find_package(Lumeris) and with pkg-config. Both programs must run and fit "A" into its cell.
 set -euo pipefail
 build=$1
@@ -9,7 +10,7 @@ work=$(mktemp -d "${TMPDIR:-/tmp}/lumeris-sdk.XXXXXX")
 trap 'rm -rf "$work"' EXIT
 prefix=$work/prefix
 
-cmake --install "$build" --prefix "$prefix" >/dev/null
+cmake --install "$build" --prefix "$prefix" --component panel-sdk >/dev/null
 
 # Only the installed prefix may be found: no compiler cache, no package registry, no system copy.
 cmake -S "$example" -B "$work/cmake" -G Ninja -DCMAKE_PREFIX_PATH="$prefix" \
