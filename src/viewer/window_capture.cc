@@ -91,18 +91,35 @@ cairo_surface_t* CacheWindowContentsImage(xcb_connection_t* connection, xcb_wind
   const PixelBox wanted = rect.IsEmpty() ? whole : ToPixels(rect, device_scale);
   if (wanted.width <= 0 || wanted.height <= 0) return nullptr;
   // The part of the wanted box inside the window: what the server is asked for.
-  const int left = std::max(wanted.x, 0);
-  const int top = std::max(wanted.y, 0);
-  const int right = std::min(wanted.x + wanted.width, whole.width);
-  const int bottom = std::min(wanted.y + wanted.height, whole.height);
+  int left = std::max(wanted.x, 0);
+  int top = std::max(wanted.y, 0);
+  int right = std::min(wanted.x + wanted.width, whole.width);
+  int bottom = std::min(wanted.y + wanted.height, whole.height);
   if (right <= left || bottom <= top) return nullptr;
-
-  Reply<xcb_get_image_reply_t> image(xcb_get_image_reply(
-      connection,
-      xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, window, static_cast<int16_t>(left),
-                    static_cast<int16_t>(top), static_cast<uint16_t>(right - left),
-                    static_cast<uint16_t>(bottom - top), ~0u),
-      nullptr));
+  const auto fetch = [&] {
+    return Reply<xcb_get_image_reply_t>(xcb_get_image_reply(
+        connection,
+        xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, window, static_cast<int16_t>(left),
+                      static_cast<int16_t>(top), static_cast<uint16_t>(right - left),
+                      static_cast<uint16_t>(bottom - top), ~0u),
+        nullptr));
+  };
+  Reply<xcb_get_image_reply_t> image = fetch();
+  // A window drawn straight on the screen can only be read where it is on the screen: ask again
+  // for that part alone (the rest stays white).
+  if (!image) {
+    Reply<xcb_translate_coordinates_reply_t> origin(xcb_translate_coordinates_reply(
+        connection, xcb_translate_coordinates(connection, window, geometry->root, 0, 0), nullptr));
+    Reply<xcb_get_geometry_reply_t> screen(
+        xcb_get_geometry_reply(connection, xcb_get_geometry(connection, geometry->root), nullptr));
+    if (!origin || !screen) return nullptr;
+    left = std::max(left, -origin->dst_x);
+    top = std::max(top, -origin->dst_y);
+    right = std::min(right, screen->width - origin->dst_x);
+    bottom = std::min(bottom, screen->height - origin->dst_y);
+    if (right <= left || bottom <= top) return nullptr;
+    image = fetch();
+  }
   if (!image) return nullptr;
 
   const xcb_setup_t* setup = xcb_get_setup(connection);

@@ -18,12 +18,13 @@
 //   of the rectangle outside the window are white; a rectangle wholly outside gives nullptr.
 // - The picture is opaque: the window's pixels are laid over white, so transparent parts of a
 //   window with an alpha channel (a 32-bit ARGB visual, premultiplied) come out white.
-// The pixels are those of the window's own storage (xcb_get_image): for an ordinary window parts
-// covered by other windows or outside the screen are whatever the X server holds there, as the
-// core protocol says; a window with an ARGB visual is kept off-screen by the server and is read
-// whole.
+// The pixels are those of the window's own storage (xcb_get_image). A window with an ARGB visual
+// is kept off-screen by the X server and is read whole. An ordinary window is read from the
+// screen: parts beyond the screen's edges come out white, and parts covered by other windows
+// show whatever the server holds there, as the core protocol says.
 //
-// Failures are values: nullptr when the window does not exist, is unmapped or not viewable, or
+// Failures are values: nullptr when the window does not exist, is unmapped or not viewable, the
+// rectangle lies wholly outside the window (or, for an ordinary window, off the screen), or
 // its pixel format is not 32 bits per pixel TrueColor (depth 24 or 32), or the server gives no
 // image.
 //

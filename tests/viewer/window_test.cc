@@ -65,6 +65,16 @@ TEST_F(WindowTest, CapturesTheWholeWindowOrAPartOfIt) {
     cairo_surface_destroy(picture);
   }
   EXPECT_EQ(CacheWindowContentsImage(x_.connection(), window, {100, 100, 5, 5}), nullptr);
+  // Hanging over the screen's bottom-right corner: only the part on the screen can be read.
+  const xcb_window_t corner = x_.CreateWindow(x_.root(), x_.screen_width() - 3, x_.screen_height() - 2, 40, 30);
+  x_.Show(corner);
+  x_.Paint(corner, 24, 40, 30, pixels);
+  cairo_surface_t* cut = CacheWindowContentsImage(x_.connection(), corner, {});
+  ASSERT_NE(cut, nullptr);
+  EXPECT_EQ(PixelAt(cut, 2, 1), Pattern(2, 1));
+  EXPECT_EQ(PixelAt(cut, 3, 1), 0xFFFFFFFFu);
+  EXPECT_EQ(PixelAt(cut, 2, 2), 0xFFFFFFFFu);
+  cairo_surface_destroy(cut);
   const xcb_window_t unmapped = x_.CreateWindow(x_.root(), 0, 0, 5, 5);
   EXPECT_EQ(CacheWindowContentsImage(x_.connection(), unmapped, {}), nullptr);
   x_.Destroy(unmapped);

@@ -33,6 +33,8 @@ class XDisplay {
   bool connected() const { return connection_ != nullptr; }
   xcb_connection_t* connection() const { return connection_; }
   xcb_window_t root() const { return screen_->root; }
+  int screen_width() const { return screen_->width_in_pixels; }
+  int screen_height() const { return screen_->height_in_pixels; }
 
   // A window of the root's depth, or of the 32-bit ARGB visual when `argb` (XCB_NONE when the
   // server has none); not yet shown.
