@@ -6,7 +6,7 @@ lumeris_add_gtest(lumeris_panel_helpers_test
     ${CMAKE_CURRENT_LIST_DIR}/categories/font_fitting_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/viewer/panel_diagnostics_test.cc
     ${CMAKE_CURRENT_LIST_DIR}/viewer/window_test.cc
-  LIBS lumeris Fontconfig::Fontconfig
+  LIBS lumeris
   LABELS viewer)
 target_compile_definitions(lumeris_panel_helpers_test PRIVATE
   LUMERIS_TEST_PICTURES="${CMAKE_BINARY_DIR}/test-pictures")
