@@ -1,0 +1,187 @@
+#include "categories/font_fitting.h"
+
+#include <pango/pangocairo.h>
+
+#include <cmath>
+#include <cstring>
+#include <memory>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "categories/tinted_image.h"
+#include "support/pictures.h"
+
+// Fontconfig's configuration and Pango's font caches (filled by a thread of Pango's own) live
+// until the process ends and are never freed; the leak checker is told to pass over them.
+extern "C" const char* __lsan_default_suppressions() {
+  return "leak:libfontconfig.so\nleak:libpangoft2-1.0.so\n";
+}
+
+namespace lumeris {
+namespace {
+
+using FontPtr = std::unique_ptr<PangoFontDescription, decltype(&pango_font_description_free)>;
+FontPtr Font(const char* name) { return {pango_font_description_from_string(name), pango_font_description_free}; }
+
+// What the test reads from Pango itself about the first glyph of `text` at 100 pt and 72 dpi:
+// ink box (bottom-up: y up from the baseline), advance, ascent, descent, in points.
+struct Glyph {
+  Rect box;
+  double advance, ascent, descent;
+};
+Glyph Measure(const char* text, const char* font) {
+  cairo_surface_t* surface = cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 1, 1);
+  cairo_t* cr = cairo_create(surface);
+  cairo_font_options_t* options = cairo_font_options_create();
+  cairo_font_options_set_hint_metrics(options, CAIRO_HINT_METRICS_OFF);
+  cairo_font_options_set_hint_style(options, CAIRO_HINT_STYLE_NONE);
+  cairo_set_font_options(cr, options);
+  PangoLayout* layout = pango_cairo_create_layout(cr);
+  pango_cairo_context_set_resolution(pango_layout_get_context(layout), 72);
+  pango_layout_set_font_description(layout, Font(font).get());
+  pango_layout_set_text(layout, text, -1);
+  const auto* run = static_cast<PangoGlyphItem*>(pango_layout_get_line_readonly(layout, 0)->runs->data);
+  PangoRectangle ink, logical;
+  pango_font_get_glyph_extents(run->item->analysis.font, run->glyphs->glyphs[0].glyph, &ink, &logical);
+  PangoFontMetrics* metrics = pango_font_get_metrics(run->item->analysis.font, nullptr);
+  const double u = PANGO_SCALE;
+  const Glyph glyph{{ink.x / u, -(ink.y + ink.height) / u, ink.width / u, ink.height / u}, logical.width / u,
+                    pango_font_metrics_get_ascent(metrics) / u, pango_font_metrics_get_descent(metrics) / u};
+  pango_font_metrics_unref(metrics);
+  g_object_unref(layout);
+  cairo_font_options_destroy(options);
+  cairo_destroy(cr);
+  cairo_surface_destroy(surface);
+  return glyph;
+}
+
+struct Fitted {
+  FontPtr font{nullptr, pango_font_description_free};
+  Rect rect{-1, -1, -1, -1};
+  double size() const { return pango_font_description_get_size(font.get()) / double{PANGO_SCALE}; }
+};
+Fitted Fit(const char* text, const char* font, Rect target) {
+  Fitted fitted;
+  fitted.font.reset(FontForCharacterFittingInRect(text, Font(font).get(), &fitted.rect, target));
+  return fitted;
+}
+
+TEST(FontFittingTest, OnlyOneGlyphOrAGlyphAndAVariationSelectorFits) {
+  const struct {
+    const char* text;
+    const char* font;
+    bool fits;
+  } kCases[] = {
+      {"A", "DejaVu Sans 100", true},
+      {"A\uFE0F", "DejaVu Sans 100", true},            // two glyphs, the second from U+FE0F
+      {"\u2764\uFE0F", "Noto Color Emoji 100", true},  // shaped into one glyph
+      {"x\u0301", "DejaVu Sans 100", false},           // a second glyph from a combining accent
+      {"x\u0301\u0302", "DejaVu Sans 100", false},     // three glyphs
+      {"", "DejaVu Sans 100", false},
+  };
+  for (const auto& c : kCases) {
+    const Fitted fitted = Fit(c.text, c.font, {0, 0, 40, 40});
+    EXPECT_EQ(fitted.font != nullptr, c.fits) << c.text;
+    if (!c.fits) {
+      EXPECT_EQ(fitted.rect, (Rect{-1, -1, -1, -1})) << c.text;  // left untouched
+    }
+  }
+  const Fitted plain = Fit("A", "DejaVu Sans 100", {0, 0, 40, 40});
+  const Fitted selected = Fit("A\uFE0F", "DejaVu Sans 100", {0, 0, 40, 40});
+  EXPECT_EQ(plain.size(), selected.size());
+  EXPECT_EQ(plain.rect, selected.rect);
+  EXPECT_STREQ(pango_font_description_get_family(plain.font.get()), "DejaVu Sans");
+}
+
+// The largest whole size at which the glyph's extents, which grow with the size, stay inside
+// the target, never above the font's own; the out-rectangle is the box at that size, rounded.
+TEST(FontFittingTest, FitsTheLargestWholeSizeInsideTheTarget) {
+  const struct {
+    const char* text;
+    const char* font;
+    Rect target;
+  } kCases[] = {
+      {"A", "DejaVu Sans 100", {7, 9, 40, 500}},   // width decides; the origin is not used
+      {"g", "DejaVu Sans 100", {0, 0, 500, 30}},   // height decides, from the descent up
+      {".", "DejaVu Sans 100", {0, 0, 20, 500}},   // narrower than its advance: the advance decides
+      {"\U0001F600", "Noto Color Emoji 100", {0, 0, 33, 33}},
+      {"A", "DejaVu Sans 100", {0, 0, 1000, 1000}},  // larger target: size unchanged
+  };
+  for (const auto& c : kCases) {
+    SCOPED_TRACE(c.text);
+    const Glyph g = Measure(c.text, c.font);
+    const double horizontal = std::max(g.box.x + g.box.width, g.advance) - std::min(g.box.x, 0.0);
+    const double vertical = std::max(g.ascent, g.box.y + g.box.height) - std::min(-g.descent, g.box.y);
+    const double expected = std::min({std::floor(c.target.width * 100 / horizontal),
+                                      std::floor(c.target.height * 100 / vertical), 100.0});
+    const Fitted fitted = Fit(c.text, c.font, c.target);
+    ASSERT_NE(fitted.font, nullptr);
+    EXPECT_EQ(fitted.size(), expected);
+    const double k = expected / 100;
+    EXPECT_EQ(fitted.rect, (Rect{std::round(g.box.x * k), std::round(g.box.y * k), std::round(g.box.width * k),
+                                 std::round(g.box.height * k)}));
+  }
+  const Glyph dot = Measure(".", "DejaVu Sans 100");
+  EXPECT_LT(dot.box.x + dot.box.width, dot.advance);  // the case above is the one it claims
+  EXPECT_EQ(Fit(".", "DejaVu Sans 100", {0, 0, 20, 500}).size(), std::floor(20 * 100 / dot.advance));
+}
+
+TEST(FontFittingTest, DrawsTheFittedGlyphInItsCell) {
+  const Fitted cell = Fit("g", "DejaVu Sans 100", {0, 0, 40, 40});
+  ASSERT_NE(cell.font, nullptr);
+  cairo_surface_t* surface = cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 40, 40);
+  cairo_t* cr = cairo_create(surface);
+  cairo_set_source_rgb(cr, 1, 1, 1);
+  cairo_paint(cr);
+  PangoLayout* layout = pango_cairo_create_layout(cr);
+  pango_cairo_context_set_resolution(pango_layout_get_context(layout), 72);
+  pango_layout_set_font_description(layout, cell.font.get());
+  pango_layout_set_text(layout, "g", -1);
+  const double baseline = 38 + cell.rect.y;  // the lowest ink two points above the bottom
+  cairo_move_to(cr, 0, baseline - pango_layout_get_baseline(layout) / double{PANGO_SCALE});
+  cairo_set_source_rgb(cr, 0, 0, 0);
+  pango_cairo_show_layout(cr, layout);
+  // The out-rectangle, drawn top-down as the header says, in red around the ink.
+  cairo_rectangle(cr, cell.rect.x, baseline - (cell.rect.y + cell.rect.height), cell.rect.width, cell.rect.height);
+  cairo_set_source_rgb(cr, 1, 0, 0);
+  cairo_set_line_width(cr, 1);
+  cairo_stroke(cr);
+  g_object_unref(layout);
+  cairo_destroy(cr);
+  EXPECT_TRUE(testing::WritePicture(surface, "fitted_glyph"));
+  cairo_surface_destroy(surface);
+}
+
+TEST(TintedImageTest, FillsTheSourceAlphaWithTheColour) {
+  // Opaque red, half-covering green, transparent, opaque white (premultiplied).
+  cairo_surface_t* source = cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 4, 1);
+  cairo_surface_flush(source);
+  const uint32_t kSource[] = {0xFFFF0000, 0x80008000, 0x00000000, 0xFFFFFFFF};
+  std::memcpy(cairo_image_surface_get_data(source), kSource, sizeof kSource);
+  cairo_surface_mark_dirty(source);
+  cairo_surface_t* tinted = CreateTintedImage(source, {0, 0, 1, 1});
+  ASSERT_NE(tinted, nullptr);
+  EXPECT_EQ(cairo_image_surface_get_width(tinted), 4);
+  EXPECT_EQ(cairo_image_surface_get_height(tinted), 1);
+  const uint32_t kExpected[] = {0xFF0000FF, 0x80000080, 0x00000000, 0xFF0000FF};
+  for (int x = 0; x < 4; ++x) EXPECT_EQ(testing::PixelAt(tinted, x, 0), kExpected[x]) << "x = " << x;
+  EXPECT_EQ(CreateTintedImage(nullptr, {}), nullptr);
+
+  // An icon: a ring on transparency, tinted with the selection blue.
+  cairo_surface_t* icon = cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 48, 48);
+  cairo_t* cr = cairo_create(icon);
+  cairo_set_source_rgb(cr, 0.9, 0.6, 0.1);
+  cairo_set_line_width(cr, 6);
+  cairo_arc(cr, 24, 24, 18, 0, 2 * M_PI);
+  cairo_stroke(cr);
+  cairo_destroy(cr);
+  cairo_surface_t* selected = CreateTintedImage(icon, {0.0, 0.48, 1.0, 1.0});
+  EXPECT_EQ(testing::PixelAt(selected, 24, 24), 0u);
+  EXPECT_EQ(testing::PixelAt(selected, 42, 24), 0xFF007AFFu);
+  EXPECT_TRUE(testing::WritePicture(selected, "tinted_icon"));
+  for (cairo_surface_t* s : {source, tinted, icon, selected}) cairo_surface_destroy(s);
+}
+
+}  // namespace
+}  // namespace lumeris
