@@ -7,6 +7,9 @@
 //   FenceRoundTrip     that fence alone (an empty favourites list), to subtract
 //   ReadRoundTrip/N    "read" of the N-entry recents list
 //   FsyncedWrite/N     the same domain's bytes written to a temporary file, fsync'd, renamed
+//   FirstReadAfterRestart/N  the first "read" of the N-entry list by a freshly started service
+//                      (it loads the whole file), the restart itself not timed
+//   LumerisRecents/N   the `lumeris recents` program end to end (start, read, print)
 //
 // Each benchmark reports p50_us and p90_us over its iterations. The service runs in a scratch
 // HOME/XDG environment; run inside scripts/test-env.sh so that its notifications have a bus.
@@ -50,15 +53,27 @@ class BenchService {
   const std::filesystem::path& root() const { return root_; }
 
   ~BenchService() {
+    Stop();
+    std::filesystem::remove_all(root_);
+  }
+
+  // Ends the service and starts a new one, which has nothing loaded.
+  bool Restart() {
+    Stop();
+    Start();
+    return client_ != nullptr;
+  }
+
+ private:
+  void Stop() {
     client_.reset();
     if (pid_ > 0) {
       kill(pid_, SIGTERM);
       waitpid(pid_, nullptr, 0);
     }
-    std::filesystem::remove_all(root_);
+    pid_ = -1;
   }
 
- private:
   BenchService() {
     std::string pattern = (std::filesystem::temp_directory_path() / "lumeris-store-bench-XXXXXX").string();
     root_ = mkdtemp(pattern.data());
@@ -67,7 +82,10 @@ class BenchService {
     setenv("HOME", (root_ / "home").c_str(), 1);
     setenv("XDG_CONFIG_HOME", (root_ / "config").c_str(), 1);
     setenv("XDG_RUNTIME_DIR", (root_ / "runtime").c_str(), 1);
+    Start();
+  }
 
+  void Start() {
     const char* program = getenv("LUMERIS_FILESERVICE");
     std::string path = program && *program ? program : LUMERIS_BENCH_FILESERVICE;
     char* argv[] = {path.data(), nullptr};
@@ -95,11 +113,13 @@ MessageValue Request(std::string command, std::vector<std::pair<std::string, Mes
   return request;
 }
 
-// N distinct current-form entity IDs (CJK ideographs, as the panel records plain characters).
+// N distinct current-form entity IDs (CJK ideographs and beyond, as the panel records plain
+// characters).
 std::vector<std::string> EntityIDs(int count) {
   std::vector<std::string> ids;
   for (int n = 0; n < count; ++n) {
-    icu::UnicodeString character(static_cast<UChar32>(0x4E00 + n));
+    const UChar32 code = 0x4E00 + n;
+    icu::UnicodeString character(code >= 0xD800 ? code + 0x800 : code);  // no surrogates
     ids.push_back("com.vantorel.lmk:{\"char\":\"" + EncodeUtf8Lenient(character) + "\"}");
   }
   return ids;
@@ -161,7 +181,7 @@ void BM_AddRoundTrip(benchmark::State& state) {
     return Fence(*client);
   });
 }
-BENCHMARK(BM_AddRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+BENCHMARK(BM_AddRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->Arg(100000)->UseManualTime()->Unit(benchmark::kMicrosecond);
 
 void BM_FenceRoundTrip(benchmark::State& state) {
   ServiceClient* client = BenchService::Get().client();
@@ -183,7 +203,52 @@ void BM_ReadRoundTrip(benchmark::State& state) {
     return reply && reply->Find("array") && reply->Find("array")->is_array();
   });
 }
-BENCHMARK(BM_ReadRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+BENCHMARK(BM_ReadRoundTrip)->Arg(10)->Arg(1000)->Arg(10000)->Arg(100000)->UseManualTime()->Unit(benchmark::kMicrosecond);
+
+void BM_FirstReadAfterRestart(benchmark::State& state) {
+  const int count = static_cast<int>(state.range(0));
+  if (BenchService::Get().client() == nullptr) return state.SkipWithError("no service");
+  StoreRecents(*BenchService::Get().client(), EntityIDs(count));
+  Fence(*BenchService::Get().client());
+  const MessageValue read = Request("read", {{"target", MessageValue::String("recents")},
+                                             {"identifier", MessageValue::String(Identifier(count))}});
+  std::vector<double> micros;
+  for (auto _ : state) {
+    if (!BenchService::Get().Restart()) return state.SkipWithError("the service did not restart");
+    const auto start = Clock::now();
+    std::optional<MessageValue> reply = BenchService::Get().client()->Request(read, std::chrono::seconds(60));
+    const std::chrono::duration<double> elapsed = Clock::now() - start;
+    if (!reply || !reply->Find("array") || !reply->Find("array")->is_array()) {
+      return state.SkipWithError("no list in the reply");
+    }
+    state.SetIterationTime(elapsed.count());
+    micros.push_back(elapsed.count() * 1e6);
+  }
+  std::sort(micros.begin(), micros.end());
+  if (!micros.empty()) state.counters["p50_us"] = micros[micros.size() / 2];
+}
+BENCHMARK(BM_FirstReadAfterRestart)->Arg(100000)->Iterations(5)->UseManualTime()->Unit(benchmark::kMillisecond);
+
+void BM_LumerisRecents(benchmark::State& state) {
+  const int count = static_cast<int>(state.range(0));
+  if (BenchService::Get().client() == nullptr) return state.SkipWithError("no service");
+  StoreRecents(*BenchService::Get().client(), EntityIDs(count));
+  Fence(*BenchService::Get().client());
+  std::string program = LUMERIS_BENCH_CLI, sub = "recents", option = "--identifier", id = Identifier(count);
+  char* argv[] = {program.data(), sub.data(), option.data(), id.data(), nullptr};
+  posix_spawn_file_actions_t actions;
+  posix_spawn_file_actions_init(&actions);
+  posix_spawn_file_actions_addopen(&actions, 1, "/dev/null", O_WRONLY, 0);
+  TimeIterations(state, [&] {
+    pid_t pid = -1;
+    if (posix_spawn(&pid, program.c_str(), &actions, nullptr, argv, environ) != 0) return false;
+    int status = 0;
+    waitpid(pid, &status, 0);
+    return WIFEXITED(status) && WEXITSTATUS(status) == 0;
+  });
+  posix_spawn_file_actions_destroy(&actions);
+}
+BENCHMARK(BM_LumerisRecents)->Arg(100000)->Iterations(5)->UseManualTime()->Unit(benchmark::kMillisecond);
 
 void BM_FsyncedWrite(benchmark::State& state) {
   const int count = static_cast<int>(state.range(0));

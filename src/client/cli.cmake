@@ -16,8 +16,8 @@ add_library(lumeris_cli STATIC
   ${CMAKE_CURRENT_LIST_DIR}/commands/store_commands.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/viewer_command.cc)
 target_link_libraries(lumeris_cli
-  PUBLIC lumeris_client lumeris_config CLI11::CLI11 nlohmann_json::nlohmann_json
-  PRIVATE lumeris lumeris_cli_prefs lumeris_categories lumeris_data_notation ICU::uc)  # lumeris_cli_prefs: the defaults and watch subcommands
+  PUBLIC lumeris_client lumeris_config lumeris_plist CLI11::CLI11 nlohmann_json::nlohmann_json
+  PRIVATE lumeris lumeris_cli_prefs lumeris_preferences lumeris_categories lumeris_data_notation ICU::uc)  # lumeris_cli_prefs: the defaults and watch subcommands
 
 add_executable(lumeris_cli_program ${CMAKE_CURRENT_LIST_DIR}/main.cc)
 target_link_libraries(lumeris_cli_program PRIVATE lumeris_cli)

@@ -9,6 +9,7 @@
 #include "client/defaults_command.h"
 #include "client/watch_command.h"
 #include "lumeris/config.h"
+#include "platform/property_list_io.h"
 
 namespace lumeris::cli {
 namespace {
@@ -29,7 +30,7 @@ constexpr char kExamples[] = R"(Examples:
   lumeris read-all --application com.example.app   everything in one request
   lumeris open-large-viewer /tmp/picked.txt     record the large window's path
   lumeris raw '{"command":"read","target":"recents","identifier":"com.vantorel.Lumeris.DefaultDataStorage"}'
-  lumeris raw --no-reply '{"command":"add","target":"recents","item":"x"}'
+  lumeris raw --no-reply '{"command":"add","target":"recents","item":"x","identifier":"com.vantorel.Lumeris.DefaultDataStorage"}'
   lumeris demo                                  a short tour
   lumeris defaults read com.vantorel.Lumeris    the stored preferences, as JSON
   lumeris watch                                 notifications as they arrive
@@ -37,7 +38,9 @@ Items are characters (sent as entity IDs) or entity IDs (sent as they are); --id
 defaults to com.vantorel.Lumeris.DefaultDataStorage, --application to com.vantorel.lumeris-cli.
 In raw JSON, {"$uint64": "5"}, {"$int64": "-1"}, {"$double": 5} and {"$data": "<base64>"} give
 the kinds JSON cannot tell apart; null is JSON null; {"$dictionary": {...}} is a literal dictionary.
-Exit status: 0 done, 1 no answer (or the service unreachable), 2 an unusable argument.)";
+Exit status: 0 done, 1 no answer (or the service unreachable), 2 an unusable argument (text
+that is not valid UTF-8 among them), 3 a write the service handled but the preference file
+does not hold.)";
 
 }  // namespace
 
@@ -67,6 +70,13 @@ void BuildCliApp(CLI::App& app, CliSession& session) {
 int RunCli(int argc, const char* const* argv, ServiceChannel& channel, std::ostream& out,
            std::ostream& err) {
   CliSession session(channel, out, err);
+  // The service keeps only well-formed UTF-8; an argument it would drop is refused here.
+  for (int i = 1; i < argc; ++i) {
+    if (!plist::IsPropertyListText(argv[i])) {
+      session.Complain("argument " + std::to_string(i) + " is not valid UTF-8");
+      return kExitBadArgument;
+    }
+  }
   CLI::App app("", "lumeris");
   BuildCliApp(app, session);
   try {

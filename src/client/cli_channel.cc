@@ -2,6 +2,9 @@
 
 #include <sstream>
 
+#include "platform/preferences_paths.h"
+#include "platform/property_list_io.h"
+
 namespace lumeris::cli {
 
 ClientServiceChannel::ClientServiceChannel(ServiceClientOptions options)
@@ -50,6 +53,26 @@ bool ClientServiceChannel::Send(const MessageValue& request, std::chrono::millis
     return false;
   }
   return true;
+}
+
+std::optional<StoreFileSnapshot> ClientServiceChannel::SnapshotStoreFile() {
+  std::optional<std::filesystem::path> path =
+      PreferencesFilePath("com.vantorel.Lumeris", kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
+  if (!path) return std::nullopt;
+  StoreFileSnapshot snapshot{*path, plist::Dictionary(), {}};
+  std::error_code error;
+  if (std::filesystem::exists(*path, error)) {
+    std::optional<plist::Value> file = plist::ReadPropertyListFile(*path);
+    plist::Dictionary* content = file ? file->AsDictionary() : nullptr;
+    snapshot.content = content ? std::optional<plist::Dictionary>(std::move(*content)) : std::nullopt;
+  }
+  const std::string prefix = path->filename().string() + ".corrupt-";
+  for (std::filesystem::directory_iterator it(path->parent_path(), error), end; !error && it != end;
+       it.increment(error)) {
+    std::string name = it->path().filename().string();
+    if (name.compare(0, prefix.size(), prefix) == 0) snapshot.corrupt_copies.insert(std::move(name));
+  }
+  return snapshot;
 }
 
 std::string DescribeTimeout(std::chrono::milliseconds timeout) {

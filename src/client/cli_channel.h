@@ -7,14 +7,27 @@
 #pragma once
 
 #include <chrono>
+#include <filesystem>
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 
 #include "client/service_client.h"
+#include "platform/property_list.h"
 #include "service/message_value.h"
 
 namespace lumeris::cli {
+
+// The store's preference file as this process finds it on disk.
+struct StoreFileSnapshot {
+  std::filesystem::path path;
+  // The file's dictionary (empty when there is no file); std::nullopt when it exists but cannot
+  // be read or parsed.
+  std::optional<plist::Dictionary> content;
+  // Names of the "<file>.corrupt-*" copies beside it.
+  std::set<std::string> corrupt_copies;
+};
 
 class ServiceChannel {
  public:
@@ -32,6 +45,11 @@ class ServiceChannel {
   // reason in `*error`, when the send fails or the service does not confirm within `timeout`.
   virtual bool Send(const MessageValue& request, std::chrono::milliseconds timeout,
                     std::string* error) = 0;
+
+  // The store domain's file, read by this process, so that a command can check that a write the
+  // service confirmed reached the disk; std::nullopt when the channel cannot see the service's
+  // files (then nothing is checked).
+  virtual std::optional<StoreFileSnapshot> SnapshotStoreFile() { return std::nullopt; }
 };
 
 // The channel over one ServiceClient connection, made on first use (starting the service on
@@ -47,6 +65,8 @@ class ClientServiceChannel : public ServiceChannel {
                                       std::string* error) override;
   bool Send(const MessageValue& request, std::chrono::milliseconds timeout,
             std::string* error) override;
+  // Reads the file the service uses: the same XDG paths, as the service runs as the same user.
+  std::optional<StoreFileSnapshot> SnapshotStoreFile() override;
 
  private:
   // The connection, connecting first when needed; nullptr with the reason in `*error`.

@@ -2,8 +2,13 @@
 
 #include <CLI/CLI.hpp>
 
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <cmath>
+#include <cstring>
 
 #include "client/cli_json_value.h"
 
@@ -31,6 +36,44 @@ bool CliSession::Tell(std::string_view what, const MessageValue& request) {
   if (channel_.Send(request, timeout(), &error)) return true;
   Complain(std::string(what) + ": " + error);
   return false;
+}
+
+namespace {
+
+// Why the service may have failed to write `file`, as far as this process can tell.
+std::string LikelyWriteObstacle(const std::filesystem::path& file) {
+  const std::filesystem::path dir = file.parent_path();
+  struct stat st {};
+  if (::stat(dir.c_str(), &st) == 0 && !S_ISDIR(st.st_mode)) return dir.string() + ": " + std::strerror(ENOTDIR);
+  if (::access(dir.c_str(), W_OK) != 0) return dir.string() + ": " + std::strerror(errno);
+  if (::access(file.c_str(), F_OK) == 0 && ::access(file.c_str(), R_OK) != 0) {
+    return file.string() + ": " + std::strerror(errno);
+  }
+  return "it does not hold the change (the file service's log says why; another program may have "
+         "written after it)";
+}
+
+}  // namespace
+
+int CliSession::TellStored(std::string_view what, const MessageValue& request, const StoredCheck& check) {
+  const std::optional<StoreFileSnapshot> before = channel_.SnapshotStoreFile();
+  if (!Tell(what, request)) return kExitNoAnswer;
+  const std::optional<StoreFileSnapshot> after = channel_.SnapshotStoreFile();
+  if (!after) return 0;
+  for (const std::string& copy : after->corrupt_copies) {
+    if (before && before->corrupt_copies.contains(copy)) continue;
+    Complain("warning: " + after->path.string() + " could not be parsed; the file service moved it aside to " +
+             (after->path.parent_path() / copy).string());
+  }
+  const plist::Value* found = nullptr;
+  if (after->content) {
+    auto it = after->content->find(check.key);
+    found = it == after->content->end() ? nullptr : &it->second;
+  }
+  if (after->content && check.holds(found)) return 0;
+  Complain(std::string(what) + ": not stored in " + after->path.string() + ": " +
+           LikelyWriteObstacle(after->path));
+  return kExitNotStored;
 }
 
 void CliSession::Complain(std::string_view message) { err_ << "lumeris: " << message << '\n'; }

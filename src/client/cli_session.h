@@ -4,8 +4,9 @@
 // the error stream once, in one sentence, and the command then ends with a non-zero status.
 //
 // Exit statuses of `lumeris`: 0 success; 1 the service could not be reached or did not answer in
-// time; 2 an argument the command cannot use (bad JSON, an unknown escape); CLI11's own codes
-// for malformed command lines.
+// time; 2 an argument the command cannot use (bad JSON, an unknown escape, text that is not
+// valid UTF-8 or holds NUL); 3 the service handled a write but the preference file does not
+// hold it (see TellStored); CLI11's own codes for malformed command lines.
 //
 // Thread-safety: one session per command line, used by one thread.
 #pragma once
@@ -13,6 +14,7 @@
 #include <nlohmann/json.hpp>
 
 #include <chrono>
+#include <functional>
 #include <optional>
 #include <ostream>
 #include <string>
@@ -25,6 +27,7 @@ namespace lumeris::cli {
 
 inline constexpr int kExitNoAnswer = 1;
 inline constexpr int kExitBadArgument = 2;
+inline constexpr int kExitNotStored = 3;
 
 inline constexpr char kDefaultIdentifier[] = "com.vantorel.Lumeris.DefaultDataStorage";
 inline constexpr char kDefaultApplication[] = "com.vantorel.lumeris-cli";
@@ -55,6 +58,18 @@ class CliSession {
   // Sends a request that never answers and waits until the service has handled it; false after
   // printing the reason.
   bool Tell(std::string_view what, const MessageValue& request);
+
+  // What a write leaves under `key` of the store domain: `holds` tells whether the value found
+  // there (nullptr when the key is absent) is the one the write meant.
+  struct StoredCheck {
+    std::string key;
+    std::function<bool(const plist::Value* found)> holds;
+  };
+  // Tell(), then reads the preference file back (when the channel can see it): kExitNoAnswer
+  // when Tell() failed; kExitNotStored, after printing the file and the likely reason, when the
+  // file does not hold what `check` expects; else 0. Warns on the error stream when the
+  // service moved an unparsable file aside meanwhile.
+  int TellStored(std::string_view what, const MessageValue& request, const StoredCheck& check);
 
   // Prints "lumeris: <message>" to the error stream.
   void Complain(std::string_view message);

@@ -7,7 +7,10 @@
 #include <string.h>
 #include <sys/file.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/un.h>
+#include <syslog.h>
+#include <systemd/sd-journal.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -118,14 +121,54 @@ std::optional<std::filesystem::path> FindFileServiceProgram() {
   return std::nullopt;
 }
 
+std::optional<std::filesystem::path> ServiceLogFile() {
+  std::filesystem::path state_home;
+  if (const char* xdg = getenv("XDG_STATE_HOME"); xdg != nullptr && xdg[0] == '/') {
+    state_home = xdg;
+  } else if (const char* home = getenv("HOME"); home != nullptr && home[0] == '/') {
+    state_home = std::filesystem::path(home) / ".local/state";
+  } else {
+    return std::nullopt;
+  }
+  return state_home / "lumeris" / "fileservice.log";
+}
+
+namespace {
+
+// Where a service started here writes its standard error: a journal stream when the journal
+// runs, else the log file (moved to "<file>.old" first once it is over kMaxServiceLogBytes),
+// else /dev/null. A close-on-exec descriptor, or -1.
+int OpenServiceLog() {
+  const int journal = sd_journal_stream_fd(kProgramName, LOG_INFO, /*level_prefix=*/0);
+  if (journal >= 0) {
+    fcntl(journal, F_SETFD, FD_CLOEXEC);
+    return journal;
+  }
+  if (std::optional<std::filesystem::path> file = ServiceLogFile()) {
+    std::error_code ignored;
+    std::filesystem::create_directories(file->parent_path(), ignored);
+    struct stat st {};
+    if (stat(file->c_str(), &st) == 0 && st.st_size > kMaxServiceLogBytes) {
+      std::filesystem::rename(*file, std::filesystem::path(file->string() + ".old"), ignored);
+    }
+    const int fd = open(file->c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600);
+    if (fd >= 0) return fd;
+  }
+  return open("/dev/null", O_WRONLY | O_CLOEXEC);
+}
+
+}  // namespace
+
 bool StartFileService(const std::filesystem::path& program, std::string* error) {
   // Everything the children need is prepared before fork(): after it only async-signal-safe
   // calls are made, since the caller may have other threads.
   const std::string program_text = program.string();
+  const int log_fd = OpenServiceLog();
   char* const argv[] = {const_cast<char*>(program_text.c_str()), nullptr};
   int report[2];
   if (pipe2(report, O_CLOEXEC) != 0) {
     SetError(error, std::string("pipe2: ") + strerror(errno));
+    if (log_fd >= 0) close(log_fd);
     return false;
   }
   pid_t child = fork();
@@ -133,6 +176,7 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
     SetError(error, std::string("fork: ") + strerror(errno));
     close(report[0]);
     close(report[1]);
+    if (log_fd >= 0) close(log_fd);
     return false;
   }
   if (child == 0) {
@@ -147,7 +191,7 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
     if (null_fd >= 0) {
       dup2(null_fd, 0);
       dup2(null_fd, 1);
-      dup2(null_fd, 2);
+      dup2(log_fd >= 0 ? log_fd : null_fd, 2);
     }
     // Keep only the report pipe (as fd 3, closed by a successful exec) beside 0..2.
     if (report[1] != 3) {
@@ -162,6 +206,7 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
     _exit(127);
   }
   close(report[1]);
+  if (log_fd >= 0) close(log_fd);
   int status = 0;
   while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
   }

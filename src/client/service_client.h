@@ -99,8 +99,15 @@ class ServiceClient {
 // The `lumeris-fileservice` program to start, found as described above, or std::nullopt.
 std::optional<std::filesystem::path> FindFileServiceProgram();
 
-// Starts `program` detached: in a new session, with standard streams on /dev/null, inheriting
-// the environment, and not a child of this process. False, with the reason in `*error`, when it
+// The log file of a service started on demand when no systemd journal runs:
+// "$XDG_STATE_HOME/lumeris/fileservice.log" ($XDG_STATE_HOME defaults to ~/.local/state); kept
+// under kMaxServiceLogBytes by moving it to "fileservice.log.old" before a start finds it larger.
+std::optional<std::filesystem::path> ServiceLogFile();
+inline constexpr long kMaxServiceLogBytes = 256 * 1024;
+
+// Starts `program` detached: in a new session, with standard input and output on /dev/null,
+// standard error on the systemd journal when it runs (else on ServiceLogFile()), inheriting the
+// environment, and not a child of this process. False, with the reason in `*error`, when it
 // could not be executed.
 bool StartFileService(const std::filesystem::path& program, std::string* error = nullptr);
 

@@ -1,7 +1,10 @@
 #include "platform/preference_store.h"
 
+#include <cerrno>
+#include <cstring>
 #include <utility>
 
+#include "platform/log.h"
 #include "platform/property_list_io.h"
 
 namespace lumeris {
@@ -84,34 +87,41 @@ bool PreferenceStore::Refresh(Domain& domain) {
   return true;
 }
 
-bool PreferenceStore::MoveCorruptFileAside(const Domain& domain) {
+std::optional<std::filesystem::path> PreferenceStore::MoveCorruptFileAside(const Domain& domain) {
   const std::string stem = domain.path.string() + ".corrupt-" + std::to_string(file_system_->UnixTime());
-  if (file_system_->RenameNoReplace(domain.path, stem)) return true;
-  for (int n = 1; n < 100; ++n) {
-    if (file_system_->RenameNoReplace(domain.path, stem + "-" + std::to_string(n))) return true;
+  for (int n = 0; n < 100; ++n) {
+    std::filesystem::path aside = n == 0 ? stem : stem + "-" + std::to_string(n);
+    if (file_system_->RenameNoReplace(domain.path, aside)) return aside;
   }
-  return false;
+  return std::nullopt;
 }
 
-bool PreferenceStore::WritePending(Domain& domain) {
-  if (!file_system_->CreateDirectories(domain.path.parent_path())) return false;
+std::string PreferenceStore::WritePending(Domain& domain) {
+  auto failed = [](std::string_view step) { return std::string(step) + ": " + std::strerror(errno); };
+  if (!file_system_->CreateDirectories(domain.path.parent_path())) return failed("cannot create its directory");
   std::filesystem::path lock_path = domain.path;
   lock_path += ".lock";
   std::optional<FileLock> lock = file_system_->LockExclusive(lock_path);
-  if (!lock) return false;
+  if (!lock) return failed("cannot lock " + lock_path.string());
   // Under the lock nobody else replaces the file, so the stamp check is exact.
-  if (!Refresh(domain)) return false;
+  if (!Refresh(domain)) return failed("cannot read it");
+  file_system_->RemoveStaleTemporaryFiles(domain.path, kStaleTemporaryFileSeconds);
+  plist::Dictionary merged = domain.View();
+  std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(merged);
+  if (bytes.empty()) return "a string is not valid UTF-8 or holds a NUL character";
   if (domain.corrupt) {
-    if (!MoveCorruptFileAside(domain)) return false;
+    std::optional<std::filesystem::path> aside = MoveCorruptFileAside(domain);
+    if (!aside) return failed("cannot move the unparsable file aside");
+    Log("preferences file " + domain.path.string() + " could not be parsed; moved it aside to " +
+        aside->string());
     domain.corrupt = false;
     domain.stamp.reset();
   }
-  plist::Dictionary merged = domain.View();
-  if (!file_system_->ReplaceAtomically(domain.path, plist::SerializeBinaryPropertyList(merged))) return false;
+  if (!file_system_->ReplaceAtomically(domain.path, bytes)) return failed("cannot write it");
   domain.base = std::move(merged);
   domain.pending.clear();
   domain.stamp = file_system_->Stat(domain.path);
-  return true;
+  return {};
 }
 
 std::optional<plist::Value> PreferenceStore::CopyValue(std::string_view key, std::string_view domain,
@@ -119,7 +129,7 @@ std::optional<plist::Value> PreferenceStore::CopyValue(std::string_view key, std
   Domain* d = Find(domain, user, host);
   if (d == nullptr) return std::nullopt;
   std::lock_guard lock(d->mutex);
-  if (!d->loaded) Refresh(*d);
+  Refresh(*d);
   const plist::Value* value = d->Lookup(key);
   return value ? std::optional<plist::Value>(*value) : std::nullopt;
 }
@@ -138,7 +148,14 @@ bool PreferenceStore::Synchronize(std::string_view domain, PreferencesUser user,
   if (d == nullptr) return false;
   std::lock_guard lock(d->mutex);
   if (d->pending.empty()) return Refresh(*d);
-  return WritePending(*d);
+  const std::string failure = WritePending(*d);
+  if (failure.empty()) return true;
+  // What could not be written is dropped, so that this process never presents as stored what
+  // is not in the file; the caller learns of the loss from the result.
+  Log("cannot save preferences file " + d->path.string() + ": " + failure + "; " +
+      std::to_string(d->pending.size()) + " unsaved change(s) dropped");
+  d->pending.clear();
+  return false;
 }
 
 std::vector<std::string> PreferenceStore::CopyKeyList(std::string_view domain, PreferencesUser user,
@@ -152,7 +169,7 @@ plist::Dictionary PreferenceStore::CopyDomain(std::string_view domain, Preferenc
   Domain* d = Find(domain, user, host);
   if (d == nullptr) return {};
   std::lock_guard lock(d->mutex);
-  if (!d->loaded) Refresh(*d);
+  Refresh(*d);
   return d->View();
 }
 

@@ -7,19 +7,26 @@
 //   bool written = store.Synchronize("com.vantorel.Lumeris", kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
 //
 // Semantics:
-// - A domain's view is loaded from its file on first use. SetValue changes the view at once
-//   (std::nullopt removes the key) and records the change as pending; nothing reaches the file
-//   before Synchronize.
+// - Every read (CopyValue, CopyKeyList, CopyDomain) and every Synchronize first compares the
+//   file's stamp (device, inode, size, modification and change time in nanoseconds) with the
+//   one it was loaded from and re-reads the file when it changed or vanished: the view is the
+//   file as it is now plus this process's pending changes. An unchanged domain costs one stat.
+// - SetValue changes the view at once (std::nullopt removes the key) and records the change
+//   as pending; nothing reaches the file before Synchronize.
 // - Synchronize with changes pending: take an exclusive flock on "<file>.lock", re-read the
-//   file if it changed, apply this process's pending sets and removals key by key, write a
-//   temporary file in the same directory, fsync, rename it over the file, fsync the directory,
-//   unlock. The view is then the file's content. On failure (returns false) the changes stay
-//   pending and the file is untouched.
-// - Synchronize with nothing pending only reads, and re-reads the file only when its stamp
-//   (device, inode, size, modification time) changed: an unchanged domain costs one stat.
+//   file if it changed, remove temporary files of killed writers older than a minute, apply
+//   this process's pending sets and removals key by key, write a temporary file in the same
+//   directory, fsync it, rename it over the file (the directory is not fsynced; see
+//   PreferencesFileSystem::ReplaceAtomically), unlock. The view is then the file's content.
+// - On failure Synchronize returns false, leaves the file untouched, logs one line naming the
+//   file and the reason, and drops the pending changes: the view is again the file's content,
+//   so nothing unsaved is presented as stored. A value holding a string that is not valid
+//   UTF-8 or holds NUL is never written (property_list_io.h) and fails the same way.
+// - Synchronize with nothing pending only reads.
 // - A file that exists but does not parse (or whose root is not a dictionary) reads as empty;
 //   before the domain is next written it is renamed aside to "<file>.corrupt-<unix time>"
-//   (with "-<n>" appended if that name is taken), so nothing is destroyed.
+//   (with "-<n>" appended if that name is taken), so nothing is destroyed; the move is logged
+//   with the new name.
 // - The any-user scope is read only: SetValue there is ignored.
 //
 // Thread-safety: every member may be called from any thread at the same time. Each domain has
@@ -29,6 +36,7 @@
 #pragma once
 
 #include <filesystem>
+#include <cstdint>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -73,9 +81,12 @@ class PreferenceStore {
   // REQUIRES: domain.mutex held. Loads the file if never loaded or its stamp changed.
   // False when the file exists but could not be read.
   bool Refresh(Domain& domain);
-  // REQUIRES: domain.mutex held, pending changes present.
-  bool WritePending(Domain& domain);
-  bool MoveCorruptFileAside(const Domain& domain);
+  // REQUIRES: domain.mutex held, pending changes present. Empty on success, else the reason.
+  std::string WritePending(Domain& domain);
+  // The new name, or std::nullopt when the file could not be moved.
+  std::optional<std::filesystem::path> MoveCorruptFileAside(const Domain& domain);
+
+  static constexpr std::int64_t kStaleTemporaryFileSeconds = 60;
 
   const std::shared_ptr<PreferencesFileSystem> file_system_;
   std::mutex domains_mutex_;

@@ -17,7 +17,8 @@ namespace {
 FileStamp StampOf(const struct stat& st) {
   return FileStamp{static_cast<std::uint64_t>(st.st_dev), static_cast<std::uint64_t>(st.st_ino),
                    static_cast<std::int64_t>(st.st_size),
-                   static_cast<std::int64_t>(st.st_mtim.tv_sec) * 1'000'000'000 + st.st_mtim.tv_nsec};
+                   static_cast<std::int64_t>(st.st_mtim.tv_sec) * 1'000'000'000 + st.st_mtim.tv_nsec,
+                   static_cast<std::int64_t>(st.st_ctim.tv_sec) * 1'000'000'000 + st.st_ctim.tv_nsec};
 }
 
 bool WriteAll(int fd, std::span<const std::uint8_t> bytes) {
@@ -82,7 +83,9 @@ FileContents PreferencesFileSystem::Read(const std::filesystem::path& path) {
 bool PreferencesFileSystem::CreateDirectories(const std::filesystem::path& dir) {
   std::error_code error;
   std::filesystem::create_directories(dir, error);
-  return !error && std::filesystem::is_directory(dir, error);
+  if (!error && std::filesystem::is_directory(dir, error)) return true;
+  errno = error ? error.value() : ENOTDIR;
+  return false;
 }
 
 std::optional<FileLock> PreferencesFileSystem::LockExclusive(const std::filesystem::path& lock_path) {
@@ -104,7 +107,9 @@ bool PreferencesFileSystem::ReplaceAtomically(const std::filesystem::path& path,
   ok = ::close(fd) == 0 && ok;
   if (ok) ok = ::rename(temp.c_str(), path.c_str()) == 0;
   if (!ok) {
+    const int cause = errno;
     ::unlink(temp.c_str());
+    errno = cause;
     return false;
   }
   // The directory is not fsynced: the new content is on disk before the rename, so after a
@@ -115,6 +120,22 @@ bool PreferencesFileSystem::ReplaceAtomically(const std::filesystem::path& path,
 
 bool PreferencesFileSystem::RenameNoReplace(const std::filesystem::path& from, const std::filesystem::path& to) {
   return ::renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0;
+}
+
+void PreferencesFileSystem::RemoveStaleTemporaryFiles(const std::filesystem::path& path,
+                                                      std::int64_t min_age_seconds) {
+  const std::string prefix = path.filename().string() + ".tmp-";
+  const std::int64_t now = UnixTime();
+  std::error_code error;
+  for (std::filesystem::directory_iterator it(path.parent_path(), error), end; !error && it != end;
+       it.increment(error)) {
+    const std::string name = it->path().filename().string();
+    struct stat st {};
+    if (name.compare(0, prefix.size(), prefix) != 0 || ::lstat(it->path().c_str(), &st) != 0) continue;
+    if (S_ISREG(st.st_mode) && now - static_cast<std::int64_t>(st.st_mtim.tv_sec) > min_age_seconds) {
+      ::unlink(it->path().c_str());
+    }
+  }
 }
 
 std::int64_t PreferencesFileSystem::UnixTime() { return static_cast<std::int64_t>(std::time(nullptr)); }

@@ -42,15 +42,14 @@ bool IsRecentsTarget(const std::string* target) {
   return target != nullptr && std::strncmp(target->c_str(), "recents", 7) == 0;
 }
 
+// A string value converted from UTF-8: absent when missing, not well-formed or holding NUL.
 OptionalString StringValue(const MessageValue& message, std::string_view key) {
-  const std::string* text = message.GetString(key);
-  return text ? OptionalString(*text) : std::nullopt;
+  return ConvertedString(message.GetString(key));
 }
 
-// A string the command needs; a missing one counts as empty.
+// A string the command needs; a missing one (or one that does not convert) counts as empty.
 std::string RequiredString(const MessageValue& message, std::string_view key) {
-  const std::string* text = message.GetString(key);
-  return text ? *text : std::string();
+  return StringValue(message, key).value_or(std::string());
 }
 
 // The search sub-commands: each returns the "result" value, or std::nullopt when its operation

@@ -1,6 +1,13 @@
 #include "service/string_array.h"
 
+#include "platform/property_list_io.h"
+
 namespace lumeris {
+
+std::optional<std::string> ConvertedString(const std::string* text) {
+  if (text == nullptr || !plist::IsPropertyListText(*text)) return std::nullopt;
+  return *text;
+}
 
 MessageValue CreateXPCArrayFromStringArray(const StringList& strings) {
   if (!strings || strings->empty()) return MessageValue::Null();
@@ -15,7 +22,7 @@ StringList StringArrayFromXPCArray(const MessageValue* value) {
   if (elements == nullptr || elements->empty()) return std::nullopt;
   std::vector<std::string> strings;
   for (const MessageValue& element : *elements) {
-    if (const std::string* text = element.AsString()) strings.push_back(*text);
+    if (std::optional<std::string> text = ConvertedString(element.AsString())) strings.push_back(std::move(*text));
   }
   return strings;
 }

@@ -1,6 +1,7 @@
 #include "store/recents.h"
 
 #include <algorithm>
+#include <mutex>
 #include <utility>
 
 #include "entity/entity_id.h"
@@ -57,6 +58,9 @@ bool SetRecentsIDArray(std::optional<plist::Array> list, std::string_view identi
 }
 
 void AddRecentID(const std::string& item, std::string_view identifier) {
+  // Adds of one process never lose each other: the read and the store happen under one lock.
+  static std::mutex read_modify_write;
+  std::lock_guard lock(read_modify_write);
   plist::Array list;
   if (std::optional<plist::Value> stored = CopyRecentsIDArray(identifier)) {
     if (plist::Array* entries = stored->AsArray()) list = std::move(*entries);

@@ -9,8 +9,9 @@
 // list's first entry to the skin-tone history (so storing an empty list removes the history).
 //
 // Thread-safety: every function may be called from any thread. The read-modify-write of
-// AddRecentID is not atomic against another writer: the last store wins, while other keys of the
-// domain are never lost. Ownership: returned values are copies owned by the caller.
+// AddRecentID is serialised inside the process (one lock for the store domain), so concurrent
+// adds of one process all survive; against a writer in another process it is not atomic: the
+// last store wins, while other keys of the domain are never lost. Ownership: returned values are copies owned by the caller.
 #pragma once
 
 #include <optional>

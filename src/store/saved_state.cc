@@ -9,11 +9,12 @@
 
 namespace lumeris {
 
-plist::Dictionary CopyLastState(std::string_view application) {
+plist::Dictionary CopyLastState(std::optional<std::string_view> application) {
   plist::Dictionary state;
   CFPreferencesAppSynchronize(kStoreDomain);
-  if (std::optional<plist::Value> stored = CFPreferencesCopyAppValue(StoreKey(kStateKeyPrefix, application),
-                                                                     kStoreDomain)) {
+  if (std::optional<plist::Value> stored =
+          application ? CFPreferencesCopyAppValue(StoreKey(kStateKeyPrefix, *application), kStoreDomain)
+                      : std::nullopt) {
     if (const plist::Dictionary* members = stored->AsDictionary()) state = *members;
   }
   if (std::optional<plist::Value> global = CFPreferencesCopyAppValue(kGlobalEmojiDiversityKey, kStoreDomain)) {

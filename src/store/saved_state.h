@@ -18,8 +18,9 @@ namespace lumeris {
 
 // The stored state of `application` (empty when none, or when what is stored is not a
 // dictionary), with the global member, when stored, set over a member of the same name.
-// Synchronises once, first.
-plist::Dictionary CopyLastState(std::string_view application);
+// Synchronises once, first. Without an application only the global member is read: it does
+// not depend on the application.
+plist::Dictionary CopyLastState(std::optional<std::string_view> application);
 
 // After the version check: writes the global member when `state` has it (and then posts the
 // change notification), writes the rest under "State:" + application when it has at least one

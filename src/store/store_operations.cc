@@ -64,8 +64,8 @@ void InstallStoreOperations(ServiceOperations& operations) {
     if (identifier) SetLastSkinToneSelection(item, *identifier);
   };
   operations.CopyLastState = [](const OptionalString& application) -> OptionalString {
-    if (!application) return JsonFromDictionary({});
-    return JsonFromDictionary(CopyLastState(*application));
+    return JsonFromDictionary(CopyLastState(application ? std::optional<std::string_view>(*application)
+                                                        : std::nullopt));
   };
   operations.SetLastState = [](const OptionalString& state, const OptionalString& application) {
     if (!application) return;

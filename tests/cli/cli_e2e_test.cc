@@ -88,5 +88,43 @@ TEST_F(LumerisProgramTest, DemoRunsAgainstTheService) {
   EXPECT_NE(result.out.find("The service answers."), std::string::npos) << result.out;
 }
 
+// What the service could not keep is never presented as kept: an unparsable file moved aside is
+// logged and warned about, and a preferences location that cannot be written (a file where the
+// directory belongs, which stops root too) gives a log line naming the file and a failing
+// `lumeris` that says why, while reads show only what is on disk.
+TEST_F(LumerisProgramTest, CorruptFilesAndFailedWritesAreReportedNotHidden) {
+  const std::filesystem::path dir = environment_.config_home() / "vantorel/Preferences";
+  const std::filesystem::path file = dir / "com.vantorel.Lumeris.plist";
+  std::filesystem::create_directories(dir);
+  std::ofstream(file) << "not a property list";
+  service_.Stop();
+  ::testing::internal::CaptureStderr();  // the service inherits this standard error
+  ASSERT_TRUE(service_.Start(socket_path_));
+
+  ProgramResult moved = runLumeris({"favorites", "set", "a"});
+  EXPECT_EQ(moved.status, 0) << moved.err;
+  EXPECT_NE(moved.err.find("warning: " + file.string() + " could not be parsed"), std::string::npos) << moved.err;
+
+  std::filesystem::remove_all(dir);
+  std::ofstream(dir) << "";
+  ProgramResult add = runLumeris({"recents", "add", "x"});
+  ProgramResult set = runLumeris({"favorites", "set", "y"});
+  ProgramResult read = runLumeris({"--json", "favorites"});
+  service_.Stop();
+  const std::string log = ::testing::internal::GetCapturedStderr();
+
+  for (const ProgramResult* failed : {&add, &set}) {
+    EXPECT_EQ(failed->status, 3);
+    EXPECT_NE(failed->err.find("not stored in " + file.string() + ": " + dir.string() + ": Not a directory"),
+              std::string::npos)
+        << failed->err;
+  }
+  EXPECT_EQ(nlohmann::json::parse(read.out), nlohmann::json::parse(R"({"array":null})")) << read.err;
+  EXPECT_NE(log.find("moved it aside to " + file.string() + ".corrupt-"), std::string::npos) << log;
+  EXPECT_NE(log.find("cannot save preferences file " + file.string() + ": cannot create its directory"),
+            std::string::npos)
+      << log;
+}
+
 }  // namespace
 }  // namespace lumeris::testing

@@ -3,7 +3,9 @@
 
 #include <sys/socket.h>
 
+#include <fstream>
 #include <future>
+#include <iterator>
 #include <set>
 
 #include "support/service_fixture.h"
@@ -61,6 +63,30 @@ TEST_F(OnDemandStart, ClientsStartingTogetherShareOneService) {
   }
   // A second service would have failed to bind next to the first and exited; one answers.
   EXPECT_GT(ListenerPid(*ServiceSocketPath()), 0);
+}
+
+// Without a journal, what a service started on demand writes to standard error is appended to
+// the log file under XDG_STATE_HOME, which a start moves aside once it is too large.
+TEST_F(OnDemandStart, StartedServiceLogsToTheStateDirectoryWithoutAJournal) {
+  if (std::filesystem::exists("/run/systemd/journal/stdout")) GTEST_SKIP() << "a journal runs here";
+  const std::filesystem::path log = environment_.state_home() / "lumeris/fileservice.log";
+  ASSERT_EQ(ServiceLogFile(), log);
+  std::filesystem::create_directories(log.parent_path());
+  std::ofstream(log) << std::string(kMaxServiceLogBytes + 1, 'x');
+  const std::filesystem::path program = environment_.root() / "logging-service";
+  std::ofstream(program) << "#!/bin/sh\necho 'one line' >&2\n";
+  std::filesystem::permissions(program, std::filesystem::perms::owner_all);
+  std::string error;
+  ASSERT_TRUE(StartFileService(program, &error)) << error;
+  std::string text;
+  for (const auto deadline = std::chrono::steady_clock::now() + 10s;
+       text.find('\n') == std::string::npos && std::chrono::steady_clock::now() < deadline;
+       std::this_thread::sleep_for(5ms)) {
+    std::ifstream in(log);
+    text.assign(std::istreambuf_iterator<char>(in), {});
+  }
+  EXPECT_EQ(text, "one line\n");
+  EXPECT_EQ(std::filesystem::file_size(log.string() + ".old"), static_cast<std::uintmax_t>(kMaxServiceLogBytes + 1));
 }
 
 TEST(ClientConnectErrors, ReportWhyInsteadOfHanging) {

@@ -1,7 +1,9 @@
 // The preference store: scopes and paths, the process view, synchronise and its failure paths.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <atomic>
+#include <chrono>
 #include <fstream>
 #include <iterator>
 #include <memory>
@@ -122,20 +124,23 @@ TEST_F(PreferenceStoreTest, TwoWritersMergeKeyByKey) {
             (std::vector<std::string>{"mine", "mine-later", "theirs"}));
 }
 
-TEST_F(PreferenceStoreTest, OtherWritersChangesAppearOnlyAfterSynchronize) {
+// Every read compares the file's stamp, so a file replaced by one of the same size in the same
+// second, or removed, is seen at the next read.
+TEST_F(PreferenceStoreTest, ReadsSeeAReplacedOrRemovedFileAtOnce) {
   WriteDomainFile(plist::Dictionary{{"k", "old"}});
   EXPECT_EQ(*Copy("k")->AsString(), "old");
-  WriteDomainFile(plist::Dictionary{{"k", "new!"}});
-  EXPECT_EQ(*Copy("k")->AsString(), "old");
-  ASSERT_TRUE(Synchronize());
-  EXPECT_EQ(*Copy("k")->AsString(), "new!");
+  WriteDomainFile(plist::Dictionary{{"k", "new"}});
+  EXPECT_EQ(*Copy("k")->AsString(), "new");
+  fs::remove(DomainFile());
+  EXPECT_FALSE(Copy("k").has_value());
+  EXPECT_TRUE(store_.CopyKeyList(kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost).empty());
 }
 
 TEST_F(PreferenceStoreTest, UnchangedDomainIsNotReadAgain) {
   WriteDomainFile(plist::Dictionary{{"k", 1}});
   ASSERT_TRUE(Synchronize());
   const int reads_after_load = file_system_->reads;
-  for (int i = 0; i < 5; ++i) ASSERT_TRUE(Synchronize());
+  for (int i = 0; i < 5; ++i) ASSERT_TRUE(Synchronize() && Copy("k"));
   EXPECT_EQ(file_system_->reads, reads_after_load);
 
   Set("k", 2);
@@ -162,7 +167,12 @@ TEST_F(PreferenceStoreTest, CorruptFileReadsEmptyAndIsKeptAsideBeforeNextWrite) 
   EXPECT_TRUE(CorruptCopies().empty()) << "a read alone must not move the file";
 
   Set("k", "v");
+  ::testing::internal::CaptureStderr();
   ASSERT_TRUE(Synchronize());
+  EXPECT_NE(::testing::internal::GetCapturedStderr().find(
+                "com.vantorel.Lumeris.plist could not be parsed; moved it aside to " + DomainFile().string() +
+                ".corrupt-" + std::to_string(kFixedTime) + "\n"),
+            std::string::npos);
   ASSERT_EQ(CorruptCopies().size(), 1u);
   EXPECT_EQ(CorruptCopies()[0].filename().string(), "com.vantorel.Lumeris.plist.corrupt-" + std::to_string(kFixedTime));
   EXPECT_EQ(ReadBytes(CorruptCopies()[0]), "this is not a property list");
@@ -185,8 +195,9 @@ TEST_F(PreferenceStoreTest, CorruptFileReadsEmptyAndIsKeptAsideBeforeNextWrite) 
   EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", 1}}));
 }
 
-// Failure paths: the file stays as it was and the change stays pending for the next try.
-TEST_F(PreferenceStoreTest, FailedStepsLeaveFileAndKeepChangesPending) {
+// Failure paths: the file stays as it was, one log line names it and the reason, and the
+// changes are dropped, so the view never shows what the file does not hold.
+TEST_F(PreferenceStoreTest, FailedSynchronizeLeavesTheFileLogsAndDropsTheChanges) {
   for (bool ScriptedFileSystem::*failure :
        {&ScriptedFileSystem::fail_writes, &ScriptedFileSystem::fail_lock, &ScriptedFileSystem::fail_reads}) {
     WriteDomainFile(plist::Dictionary{{"k", "file"}});
@@ -195,13 +206,52 @@ TEST_F(PreferenceStoreTest, FailedStepsLeaveFileAndKeepChangesPending) {
     WriteDomainFile(plist::Dictionary{{"k", "file"}, {"other", 1}});  // forces a re-read under the lock
     Set("k", "pending", &store);
     (*file_system_).*failure = true;
+    ::testing::internal::CaptureStderr();
     EXPECT_FALSE(Synchronize(&store));
+    const std::string log = ::testing::internal::GetCapturedStderr();
     (*file_system_).*failure = false;
+    EXPECT_EQ(std::count(log.begin(), log.end(), '\n'), 1) << log;
+    EXPECT_NE(log.find("cannot save preferences file " + DomainFile().string() + ": cannot "), std::string::npos) << log;
     EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "file"}, {"other", 1}}));
-    EXPECT_EQ(*Copy("k", &store)->AsString(), "pending");
+    EXPECT_EQ(*Copy("k", &store)->AsString(), "file");
     ASSERT_TRUE(Synchronize(&store));
-    EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "pending"}, {"other", 1}}));
+    EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "file"}, {"other", 1}}));
   }
+}
+
+// A string the property-list format cannot keep whole is never written shortened: the
+// synchronise fails and the file keeps what it had.
+TEST_F(PreferenceStoreTest, StringsThatAreNotValidUtf8OrHoldNulAreNeverWritten) {
+  for (const std::string& text : {std::string("cut\xFFhere"), std::string("cut\0here", 8), std::string("\xC0\x80")}) {
+    WriteDomainFile(plist::Dictionary{{"k", "file"}});
+    for (bool as_key : {false, true}) {
+      Set(as_key ? text : "k", Value(text));
+      ::testing::internal::CaptureStderr();
+      EXPECT_FALSE(Synchronize());
+      EXPECT_NE(::testing::internal::GetCapturedStderr().find("not valid UTF-8"), std::string::npos);
+      EXPECT_TRUE(*StoredFile() == Value(plist::Dictionary{{"k", "file"}}));
+    }
+  }
+}
+
+// Temporary files of writers killed before their rename go at the next write once a minute old.
+TEST_F(PreferenceStoreTest, StaleTemporaryFilesAreRemovedByTheNextWrite) {
+  WriteDomainFile(plist::Dictionary{{"k", 1}});
+  const fs::path stale = DomainFile().string() + ".tmp-AbC123", fresh = DomainFile().string() + ".tmp-XyZ789";
+  const fs::path other = DomainFile().parent_path() / "other.plist.tmp-AbC123";
+  for (const fs::path& path : {stale, fresh, other}) std::ofstream(path) << "partial";
+  // Ages count from the store's clock, fixed at kFixedTime.
+  const auto at = [](std::int64_t seconds) {
+    return std::chrono::file_clock::from_sys(std::chrono::sys_seconds(std::chrono::seconds(seconds)));
+  };
+  fs::last_write_time(stale, at(kFixedTime - 61));
+  fs::last_write_time(fresh, at(kFixedTime - 30));
+  fs::last_write_time(other, at(kFixedTime - 3600));
+  Set("k", 2);
+  ASSERT_TRUE(Synchronize());
+  EXPECT_FALSE(fs::exists(stale));
+  EXPECT_TRUE(fs::exists(fresh));
+  EXPECT_TRUE(fs::exists(other)) << "only this domain's files";
 }
 
 TEST_F(PreferenceStoreTest, AnyUserScopeIsReadOnly) {

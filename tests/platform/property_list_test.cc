@@ -32,8 +32,17 @@ Value Nested(int depth) {
   return value;
 }
 
+// `count` distinct strings that all end alike, as entity IDs do.
+Value ManyStrings(int count) {
+  Array array;
+  for (int i = 0; i < count; ++i) array.emplace_back("\u65e5" + std::to_string(i) + "\"}");
+  return array;
+}
+
 std::vector<std::pair<const char*, Value>> RoundTripCases() {
   return {
+      {"long_strings", Value(Array{std::string(300, 'a'), "\u00e9" + std::string(20, 'b')})},
+      {"two_byte_references", ManyStrings(300)}, {"four_byte_references", ManyStrings(70000)},
       {"empty_string", Value()}, {"ascii_string", Value("Sorvendi")},
       {"non_ascii_string", Value("caf\u00e9 \u65e5\u672c \U0001F600")},
       {"zero", Value(0)}, {"small_int", Value(255)}, {"two_byte_int", Value(256)},
@@ -63,6 +72,17 @@ TEST_P(PropertyListRoundTrip, EveryTypeSurvivesUnchanged) {
     ASSERT_TRUE(back.has_value());
     EXPECT_EQ(back->type(), value.type());
     EXPECT_TRUE(*back == value);
+  }
+}
+
+// The writers never shorten or alter a string: a value holding one that is not well-formed
+// UTF-8 or holds NUL is not written at all.
+TEST_P(PropertyListRoundTrip, StringsThatCannotBeKeptWholeAreNotWritten) {
+  for (const std::string& text : {std::string("a\0b", 3), std::string("cut\xFF"), std::string("\xED\xA0\x80")}) {
+    for (const Value& value : {Value(text), Value(Array{"ok", text}), Value(Dictionary{{text, 1}})}) {
+      EXPECT_TRUE(GetParam() == Format::kBinary ? SerializeBinaryPropertyList(value).empty()
+                                                : SerializeXmlPropertyList(value).empty());
+    }
   }
 }
 

@@ -290,14 +290,22 @@ TEST_F(DispatchTest, OpenLargeViewerAnswersEmptyAfterWritingThePath) {
 
 // --- Bad requests and missing operations ---------------------------------------------------
 
-TEST_F(DispatchTest, WrongTypedValuesReadAsAbsentAndBytesArePassedAsSent) {
+// Strings are converted from UTF-8: one that is not well-formed or holds NUL counts as missing,
+// like a value of another type (an item then reads empty, an identifier absent, a list element
+// is skipped).
+TEST_F(DispatchTest, WrongTypedValuesAndTextThatDoesNotConvertReadAsAbsent) {
   EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary()));
   EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary({{"command", MessageValue::Uint64(3)}})));
   EXPECT_TRUE(calls_.empty());
-  const std::string invalid_utf8 = "\xff\xfe";
-  Dispatch(Request("set_skintone", {{"item", MessageValue::String(invalid_utf8)},
-                                    {"identifier", MessageValue::Uint64(1)}}));
-  EXPECT_EQ(calls_, Calls{"SetLastSkinToneSelection(" + invalid_utf8 + ",absent)"});
+  for (const MessageValue& bad : {MessageValue::Uint64(1), MessageValue::String("\xff\xfe"),
+                                  MessageValue::String(std::string("a\0b", 3)), MessageValue::String("\xED\xA0\x80")}) {
+    Dispatch(Request("set_skintone", {{"item", bad}, {"identifier", bad}}));
+    EXPECT_EQ(calls_, Calls{"SetLastSkinToneSelection(,absent)"}) << bad;
+    Dispatch(Request("set", {{"target", MessageValue::String("recents")},
+                             {"array", MessageValue::MakeArray({bad, MessageValue::String("ok")})},
+                             {"identifier", MessageValue::String("id")}}));
+    EXPECT_EQ(calls_, Calls{"SetRecentsIDArray([ok],'id')"}) << bad;
+  }
 }
 
 TEST_F(DispatchTest, CommandWhoseOperationIsMissingBehavesAsUnknown) {

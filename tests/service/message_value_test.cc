@@ -64,7 +64,8 @@ TEST(StringArrayConversions, EmptyOrAbsentListIsNullAndNonEmptyListsRoundTrip) {
                                            MessageValue::String(list[1]),
                                            MessageValue::String(list[2]),
                                            MessageValue::String(list[3])}));
-  EXPECT_EQ(StringArrayFromXPCArray(&wire), list);
+  EXPECT_EQ(StringArrayFromXPCArray(&wire), Strings(list.begin(), list.end() - 1))
+      << "a string that is not UTF-8 does not convert and is skipped";
 }
 
 TEST(StringArrayConversions, AbsentForNonArraysAndEmptyArraysEmptyForNoStrings) {

@@ -24,7 +24,8 @@ class StoreOperationsTest : public StoreTest {
   ServiceOperations operations_;
 };
 
-TEST_F(StoreOperationsTest, WithoutIdentifierOrApplicationNothingIsReadOrWritten) {
+// The global member does not depend on the application, so it is the one thing read without one.
+TEST_F(StoreOperationsTest, WithoutIdentifierOrApplicationNothingIsWrittenAndOnlyTheGlobalMemberRead) {
   SeedStore({{"Recents:", plist::Array{"r"}},
              {"Favorites:", plist::Array{"f"}},
              {"SkinTones:", plist::Dictionary{{"a", "b"}}},
@@ -34,7 +35,7 @@ TEST_F(StoreOperationsTest, WithoutIdentifierOrApplicationNothingIsReadOrWritten
   EXPECT_FALSE(operations_.CopyRecentsIDArray(std::nullopt));
   EXPECT_FALSE(operations_.CopyFavoritesIDArray(std::nullopt));
   EXPECT_FALSE(operations_.CopySkinToneHistory(std::nullopt));
-  EXPECT_EQ(operations_.CopyLastState(std::nullopt), "{}");
+  EXPECT_EQ(operations_.CopyLastState(std::nullopt), R"({"VTGlobalEmojiDiversityDescribed":true})");
   operations_.SetRecentsIDArray(StringVector{"x"}, std::nullopt);
   operations_.AddRecentID("x", std::nullopt);
   operations_.SetFavoritesIDArray(std::nullopt, std::nullopt);

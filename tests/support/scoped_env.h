@@ -61,6 +61,7 @@ class IsolatedUserEnvironment {
     env_.Set("XDG_CONFIG_HOME", (root / "config").string());
     env_.Set("XDG_CONFIG_DIRS", (root / "config-dirs").string());
     env_.Set("XDG_RUNTIME_DIR", (root / "runtime").string());
+    env_.Set("XDG_STATE_HOME", (root / "state").string());
   }
 
   const std::filesystem::path& root() const { return dir_.path(); }
@@ -68,6 +69,7 @@ class IsolatedUserEnvironment {
   std::filesystem::path config_home() const { return dir_.path() / "config"; }
   std::filesystem::path config_dirs() const { return dir_.path() / "config-dirs"; }
   std::filesystem::path runtime_dir() const { return dir_.path() / "runtime"; }
+  std::filesystem::path state_home() const { return dir_.path() / "state"; }
   // Further variables for this test only (restored with the rest).
   ScopedEnv& env() { return env_; }
 

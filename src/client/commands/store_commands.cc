@@ -2,6 +2,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <memory>
 #include <string>
 #include <vector>
@@ -71,7 +72,16 @@ void AddListCommands(CLI::App& app, CliSession& session, const std::string& targ
       }
       request.Set("array", std::move(array));
     }
-    if (!session.Tell(target + " set", request)) ExitWith(kExitNoAnswer);
+    const std::string key = (target == "recents" ? "Recents:" : "Favorites:") + options->identifier;
+    const int status = session.TellStored(target + " set", request, {key, [&ids](const plist::Value* found) {
+      if (ids.empty()) return found == nullptr;
+      const plist::Array* stored = found ? found->AsArray() : nullptr;
+      return stored != nullptr && std::equal(stored->begin(), stored->end(), ids.begin(), ids.end(),
+                                             [](const plist::Value& a, const std::string& b) {
+                                               return a.AsString() && *a.AsString() == b;
+                                             });
+    }});
+    if (status != 0) ExitWith(status);
     ReportSent(session, request,
                ids.empty() ? target + ": removed" : target + ": set to " + ItemsText(ids));
   });
@@ -92,7 +102,12 @@ void AddListCommands(CLI::App& app, CliSession& session, const std::string& targ
       request.Set("target", MessageValue::String(target));
       request.Set("identifier", MessageValue::String(options->identifier));
       request.Set("item", MessageValue::String(id));
-      if (!session.Tell(target + " add", request)) ExitWith(kExitNoAnswer);
+      const int status = session.TellStored(
+          target + " add", request, {"Recents:" + options->identifier, [&id](const plist::Value* found) {
+            const plist::Array* stored = found ? found->AsArray() : nullptr;
+            return stored && !stored->empty() && stored->front().AsString() && *stored->front().AsString() == id;
+          }});
+      if (status != 0) ExitWith(status);
       ReportSent(session, request, target + ": added " + ItemsText({id}));
     });
   }
