@@ -12,3 +12,9 @@ lumeris_add_gtest(lumeris_database_e2e_test
   SOURCES ${CMAKE_CURRENT_LIST_DIR}/database/database_e2e_test.cc
   LIBS lumeris_service_fixture lumeris_preferences lumeris
   LABELS database e2e)
+
+# The indexed search and related characters against the reference rules on the real bundle.
+lumeris_add_gtest(lumeris_database_differential_test
+  SOURCES ${CMAKE_CURRENT_LIST_DIR}/database/differential_test.cc
+  LIBS lumeris_database lumeris_categories lumeris_font_coverage lumeris_preferences lumeris SQLite::SQLite3
+  LABELS database)
