@@ -1,6 +1,8 @@
 #include "database/character_database.h"
 
 #include <stdlib.h>
+#include <sys/resource.h>
+#include <unistd.h>
 #include <string.h>
 #include <unicode/utf8.h>
 
@@ -146,7 +148,11 @@ const CharacterSearchIndex* LMCharacterDatabase::SearchIndex(Connection& connect
       search_index_ = CharacterSearchIndex::Build(connection.handle, fonts_);
     }
     if (search_index_) {
-      completion_ = std::thread([this] { search_index_->CompleteInBackground(stopping_); });
+      completion_ = std::thread([this] {
+        // Below the requests: they are served from the index as it stands meanwhile.
+        setpriority(PRIO_PROCESS, static_cast<id_t>(gettid()), 10);
+        search_index_->CompleteInBackground(stopping_);
+      });
     }
   });
   return search_index_.get();
