@@ -159,16 +159,8 @@ const std::string* CharacterSearchIndex::RarestPostings(std::string_view needle,
 }
 
 void CharacterSearchIndex::CompleteInBackground(const std::atomic<bool>& stop) {
+  // Trigrams first: they serve the searches of whole words, the most frequent.
   const uint32_t rows = size();
-  std::vector<uint32_t> emoji_rows;
-  for (uint32_t row = 0; row < rows; ++row) {
-    if (stop.load(std::memory_order_relaxed)) return;
-    if (EmojiFontDraws(row)) emoji_rows.push_back(row);
-  }
-  emoji_rows_ = std::move(emoji_rows);
-  last_emoji_row_ = emoji_rows_.empty() ? -1 : emoji_rows_.back();
-  emoji_complete_.store(true, std::memory_order_release);
-
   // Each row's distinct trigrams, appended to their lists in row order, as deltas from the
   // list's previous row.
   std::unordered_map<uint32_t, std::pair<std::string, uint32_t>> lists;
@@ -195,6 +187,15 @@ void CharacterSearchIndex::CompleteInBackground(const std::atomic<bool>& stop) {
   // The lists grew by reallocation; give the freed pages back.
   malloc_trim(0);
   trigrams_complete_.store(true, std::memory_order_release);
+
+  std::vector<uint32_t> emoji_rows;
+  for (uint32_t row = 0; row < rows; ++row) {
+    if (stop.load(std::memory_order_relaxed)) return;
+    if (EmojiFontDraws(row)) emoji_rows.push_back(row);
+  }
+  emoji_rows_ = std::move(emoji_rows);
+  last_emoji_row_ = emoji_rows_.empty() ? -1 : emoji_rows_.back();
+  emoji_complete_.store(true, std::memory_order_release);
 }
 
 }  // namespace lumeris

@@ -17,7 +17,7 @@
 // The folded texts lie end to end in one buffer, each followed by a NUL, so that a search text
 // without NUL is found by a single pass of memmem over the buffer. CompleteInBackground() adds a
 // trigram index over the folded bytes (per trigram, the rows holding it, delta-coded), after
-// which texts of three bytes or more visit only the rows of their rarest trigram, and asks the
+// which texts of three bytes or more visit only the rows of their rarest trigram, then asks the
 // emoji question for every row, after which the position of the last emoji row is known.
 //
 // Thread-safety: after Build() every const member may be called from any thread at the same time;
@@ -66,7 +66,7 @@ class CharacterSearchIndex {
   // True when the emoji answers of all rows are known and no row after `row` is an emoji row.
   bool NoEmojiRowAfter(uint32_t row) const;
 
-  // Asks the emoji question for every row, then builds the trigram index; returns early when
+  // Builds the trigram index, then asks the emoji question for every row; returns early when
   // `stop` becomes true. Call at most once.
   void CompleteInBackground(const std::atomic<bool>& stop);
 
