@@ -127,6 +127,7 @@ TEST_P(CharacterDatabaseTest, SearchRules) {
       {"ℵ", Info("alef", "heart")},   // only a later field holds the text
       {"ﬀ", Info("ﬀﬀﬀﬀﬀﬀﬀﬀﬀﬀ oak")},  // folding doubles field 0's length before the match
       {"É", Info("ÉCLAIR")},
+      {"Ω", Info("ÉTÉ", "été")},  // LIKE passes on field 1, the second search on field 0
       {"ß", Info("Straße")},
       {"1", Info("100% sure")},
       {"2", Info("100 percent")},
@@ -154,6 +155,7 @@ TEST_P(CharacterDatabaseTest, SearchRules) {
       {"OAK", {"ﬀ"}},
       {"éclair", {}},  // LIKE folds ASCII only
       {"ÉCLAIR", {"É"}},
+      {"été", {"Ω"}},
       {"STRASSE", {}},
       {"STRAßE", {"ß"}},  // LIKE passes "STRA"; the second search folds ß
       {"100%", {"1"}},    // "%" is a wildcard for LIKE only

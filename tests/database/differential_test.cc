@@ -130,7 +130,7 @@ std::vector<std::string> SearchTexts(std::mt19937_64& random, std::size_t count)
 
 TEST_F(DifferentialTest, SearchRepliesEqualTheReference) {
   const std::vector<std::string> texts =
-      SearchTexts(random_, scale_ > 0 ? 40 * static_cast<std::size_t>(scale_) : 30);
+      SearchTexts(random_, scale_ > 0 ? 40 * static_cast<std::size_t>(scale_) : 20);
   ASSERT_FALSE(texts.empty());
   InBothCountries([&] {
     std::size_t differences = 0;
