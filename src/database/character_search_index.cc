@@ -38,8 +38,14 @@ bool IsWellFormedUtf8(std::string_view text) {
 }
 
 bool IsAscii(std::string_view text) {
-  for (char c : text) {
-    if (static_cast<unsigned char>(c) >= 0x80) return false;
+  std::size_t i = 0;
+  for (; i + 8 <= text.size(); i += 8) {
+    uint64_t word;
+    memcpy(&word, text.data() + i, 8);
+    if ((word & 0x8080808080808080ULL) != 0) return false;
+  }
+  for (; i < text.size(); ++i) {
+    if (static_cast<unsigned char>(text[i]) >= 0x80) return false;
   }
   return true;
 }
@@ -82,7 +88,12 @@ std::unique_ptr<CharacterSearchIndex> CharacterSearchIndex::Build(sqlite3* db,
     const auto* info = reinterpret_cast<const char*>(sqlite3_column_text(statement, 2));
     // Rows the search can never take a result from: no info text or one that does not decode
     // (the search skips the row), or a `uchr` the candidate tests always reject.
-    if (info == nullptr || !ShowableSearchCandidateIgnoringRegion(uchr)) continue;
+    // ShowableSearchCandidateIgnoringRegion without making the string: DecodeUtf8 succeeds on
+    // exactly the well-formed texts.
+    if (info == nullptr || !FirstCodePointIsShowable(uchr) || *uchr == '\0' ||
+        !IsWellFormedUtf8(uchr)) {
+      continue;
+    }
     // As a C string, like the search reads it.
     const std::string_view info_text(info);
     const bool info_ascii = IsAscii(info_text);
