@@ -5,9 +5,9 @@
 // Measures: the first search after the service starts; searches of the 3-or-more-letter words of
 // bench/data/search_words.txt (a seeded sample of CLDR's English annotation keywords) and of one
 // and two letters, limit 100; "a" with limit 2^63; related characters and information records;
-// searches from 8 connections at once (the words once more); the service's resident memory after 10,000 mixed requests
-// and after 10,000 more. Each service runs in a private temporary HOME and XDG_RUNTIME_DIR and is
-// stopped at the end. `database_bench indexed` skips the reference run.
+// searches from 8 connections at once (the words once more); the service's resident memory after
+// 10,000 mixed requests and after 10,000 more. Each service runs in a private temporary HOME and
+// XDG_RUNTIME_DIR and is stopped at the end. `database_bench indexed` skips the reference run.
 #include <stdlib.h>
 #include <sys/socket.h>
 #include <sys/un.h>
@@ -91,7 +91,8 @@ double ResidentMegabytes(pid_t pid) {
 }
 
 struct Figures {
-  double first = 0, words_p50 = 0, words_p99 = 0, again_p50 = 0, again_p99 = 0, short_p50 = 0, a_unlimited = 0;
+  double first = 0, words_p50 = 0, words_p99 = 0, again_p50 = 0, again_p99 = 0, short_p50 = 0,
+         a_unlimited = 0;
   double related_p50 = 0, info_p50 = 0, parallel_per_second = 0, rss_after = 0, rss_later = 0;
 };
 
@@ -117,7 +118,8 @@ Figures Measure(const char* rules, const std::vector<std::string>& words, bool f
   figures.first = Time(*client, {Request("search_matched_chars", "heart", 100)})[0];
 
   std::vector<MessageValue> searches;
-  for (const std::string& word : words) searches.push_back(Request("search_matched_chars", word, 100));
+  for (const std::string& word : words)
+    searches.push_back(Request("search_matched_chars", word, 100));
   std::vector<double> samples = Time(*client, searches);
   figures.words_p50 = Percentile(samples, 50);
   figures.words_p99 = Percentile(samples, 99);
@@ -130,8 +132,9 @@ Figures Measure(const char* rules, const std::vector<std::string>& words, bool f
   for (const char* text : {"a", "e", "x", "q", "7", "he", "ca", "zz", "on", "qx", "st", "9"})
     short_searches.push_back(Request("search_matched_chars", text, 100));
   figures.short_p50 = Percentile(Time(*client, short_searches), 50);
-  figures.a_unlimited =
-      Percentile(Time(*client, std::vector<MessageValue>(3, Request("search_matched_chars", "a", kNoLimit))), 50);
+  figures.a_unlimited = Percentile(
+      Time(*client, std::vector<MessageValue>(3, Request("search_matched_chars", "a", kNoLimit))),
+      50);
 
   std::vector<MessageValue> related;
   std::vector<MessageValue> info;
@@ -151,7 +154,8 @@ Figures Measure(const char* rules, const std::vector<std::string>& words, bool f
   for (int t = 0; t < 8; ++t) {
     threads.emplace_back([&, t] {
       std::unique_ptr<ServiceClient> own = ServiceClient::Connect({}, nullptr);
-      for (std::size_t i = static_cast<std::size_t>(t) * 25; own && Clock::now() - start < 2s; ++i) {
+      for (std::size_t i = static_cast<std::size_t>(t) * 25; own && Clock::now() - start < 2s;
+           ++i) {
         if (!own->Request(searches[i % searches.size()], 120s)) return;
         ++done;
       }
@@ -168,10 +172,18 @@ Figures Measure(const char* rules, const std::vector<std::string>& words, bool f
     for (int i = 0; i < 10000; ++i) {
       const std::string& word = words[random() % words.size()];
       switch (random() % 4) {
-        case 0: mixed.push_back(Request("search_matched_chars", word, 100)); break;
-        case 1: mixed.push_back(Request("search_matched_chars", word.substr(0, 1 + random() % 2), 100)); break;
-        case 2: mixed.push_back(Request("search_related_chars", word.substr(0, 1), 100)); break;
-        default: mixed.push_back(Request("search_character_info", word.substr(0, 1), 0)); break;
+        case 0:
+          mixed.push_back(Request("search_matched_chars", word, 100));
+          break;
+        case 1:
+          mixed.push_back(Request("search_matched_chars", word.substr(0, 1 + random() % 2), 100));
+          break;
+        case 2:
+          mixed.push_back(Request("search_related_chars", word.substr(0, 1), 100));
+          break;
+        default:
+          mixed.push_back(Request("search_character_info", word.substr(0, 1), 0));
+          break;
       }
     }
     const pid_t pid = ServicePid();
@@ -219,9 +231,10 @@ int Main(int argc, char** argv) {
   row("related characters, limit 100, p50 ms (goal <= 0.3)", &Figures::related_p50);
   row("information record, p50 ms (goal <= 0.3)", &Figures::info_p50);
   row("8 connections, searches/s (goal >= 3000)", &Figures::parallel_per_second);
-  std::printf("resident memory after 10,000 mixed requests: %.1f MB, after 10,000 more: %.1f MB "
-              "(goal <= 40, within 5%%)\n",
-              indexed.rss_after, indexed.rss_later);
+  std::printf(
+      "resident memory after 10,000 mixed requests: %.1f MB, after 10,000 more: %.1f MB "
+      "(goal <= 40, within 5%%)\n",
+      indexed.rss_after, indexed.rss_later);
   return 0;
 }
 

@@ -1,10 +1,10 @@
 #include "database/character_database.h"
 
 #include <stdlib.h>
-#include <sys/resource.h>
-#include <unistd.h>
 #include <string.h>
+#include <sys/resource.h>
 #include <unicode/utf8.h>
+#include <unistd.h>
 
 #include <array>
 #include <utility>
@@ -255,7 +255,8 @@ MessageValue LMCharacterDatabase::IndexedSearch(Connection& connection, const st
       // Unsigned on purpose, as in the reference.
       return static_cast<std::uint64_t>(emoji.size()) < static_cast<std::uint64_t>(maxCount);
     }
-    if (index.DefaultLikeFontDraws(row)) deferred.push_back(EncodeUtf8Lenient(DecodeUtf8Lenient(uchr)));
+    if (index.DefaultLikeFontDraws(row))
+      deferred.push_back(EncodeUtf8Lenient(DecodeUtf8Lenient(uchr)));
     return true;
   });
 

@@ -27,9 +27,8 @@
 #pragma once
 
 #include <sqlite3.h>
-#include <unicode/unistr.h>
-
 #include <string.h>
+#include <unicode/unistr.h>
 
 #include <algorithm>
 #include <atomic>
@@ -57,7 +56,8 @@ class CharacterSearchIndex {
   void ForEachMatch(std::string_view folded, bool emoji_only, Visit&& visit) const;
 
   std::string_view uchr(uint32_t row) const {
-    return std::string_view(uchr_).substr(uchr_start_[row], uchr_start_[row + 1] - uchr_start_[row]);
+    return std::string_view(uchr_).substr(uchr_start_[row],
+                                          uchr_start_[row + 1] - uchr_start_[row]);
   }
   sqlite3_int64 rowid(uint32_t row) const { return rowid_[row]; }
   bool field0_is_ascii(uint32_t row) const { return ascii_[row] != 0; }
@@ -133,7 +133,8 @@ void CharacterSearchIndex::ForEachMatch(std::string_view needle, bool emoji_only
   const char* const end = begin + folded_.size();
   const char* from = begin;
   while (from < end) {
-    const void* hit = memmem(from, static_cast<std::size_t>(end - from), needle.data(), needle.size());
+    const void* hit =
+        memmem(from, static_cast<std::size_t>(end - from), needle.data(), needle.size());
     if (hit == nullptr) return;
     const auto offset = static_cast<uint32_t>(static_cast<const char*>(hit) - begin);
     const auto next = std::upper_bound(folded_start_.begin(), folded_start_.end(), offset);

@@ -80,22 +80,25 @@ class DifferentialTest : public ::testing::Test {
 // Search texts of every kind a picker sends: parts of real names and keywords in random case,
 // one and two letters, LIKE wildcards, quotes, other scripts, emoji, nothing, and misses.
 std::vector<std::string> SearchTexts(std::mt19937_64& random, std::size_t count) {
-  const std::vector<std::string> names = Column(
-      "CharacterDB", "select substr(info, 1, instr(info, '|') - 1) from unihan_dict");
+  const std::vector<std::string> names =
+      Column("CharacterDB", "select substr(info, 1, instr(info, '|') - 1) from unihan_dict");
   const std::vector<std::string> emoji =
       Column("CharacterDB", "select uchr from unihan_dict limit 4000");
   const std::vector<std::string> fixed = {
-      "",   "%",  "_",  "%%", "a%b", "c_t", "'", "\"", "it's", "a'b", "é", "É", "ß", "SS",
-      "ſ",  "K", "İ",  "中", "ё",   "Ω",   "ω", "ǅ",  "zqxjv", "qqqqqqq", "🇹🇼", "|", "a|",
-      " ",  "-",  "1",  "ä",  "Ä",   "ﬀ",   "st"};
+      "",   "%",  "_",  "%%", "a%b", "c_t", "'", "\"", "it's", "a'b", "é",     "É",
+      "ß",  "SS", "ſ",  "K",  "İ",   "中",  "ё", "Ω",  "ω",    "ǅ",   "zqxjv", "qqqqqqq",
+      "🇹🇼", "|",  "a|", " ",  "-",   "1",   "ä", "Ä",  "ﬀ",    "st"};
   std::vector<std::string> texts;
-  auto pick = [&](std::size_t n) { return std::uniform_int_distribution<std::size_t>(0, n - 1)(random); };
+  auto pick = [&](std::size_t n) {
+    return std::uniform_int_distribution<std::size_t>(0, n - 1)(random);
+  };
   while (texts.size() < count) {
     const icu::UnicodeString name = DecodeUtf8Lenient(names[pick(names.size())]);
     icu::UnicodeString text;
     switch (pick(7)) {
       case 0: {  // a part of a name, in random case
-        const int32_t start = static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1));
+        const int32_t start =
+            static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1));
         text = name.tempSubString(start, static_cast<int32_t>(1 + pick(12)));
         for (int32_t i = 0; i < text.length(); ++i) {
           icu::UnicodeString unit = text.tempSubString(i, 1);
@@ -111,10 +114,12 @@ std::vector<std::string> SearchTexts(std::mt19937_64& random, std::size_t count)
         break;
       }
       case 2:  // one letter
-        text = name.tempSubString(static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1)), 1);
+        text = name.tempSubString(
+            static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1)), 1);
         break;
       case 3:  // two letters
-        text = name.tempSubString(static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1)), 2);
+        text = name.tempSubString(
+            static_cast<int32_t>(pick(static_cast<std::size_t>(name.length()) + 1)), 2);
         break;
       case 4:
         texts.push_back(emoji[pick(emoji.size())]);
@@ -141,8 +146,9 @@ TEST_F(DifferentialTest, SearchRepliesEqualTheReference) {
         const MessageValue expected = reference_.createXPCArrayForSearchString(request, max_count);
         const MessageValue actual = indexed_.createXPCArrayForSearchString(request, max_count);
         if (actual != expected && ++differences <= 5) {
-          ADD_FAILURE() << "\"" << text << "\" limit " << limit << "\n indexed:   "
-                        << Describe(actual) << "\n reference: " << Describe(expected);
+          ADD_FAILURE() << "\"" << text << "\" limit " << limit
+                        << "\n indexed:   " << Describe(actual)
+                        << "\n reference: " << Describe(expected);
         }
       }
     }
@@ -151,7 +157,8 @@ TEST_F(DifferentialTest, SearchRepliesEqualTheReference) {
 }
 
 TEST_F(DifferentialTest, RelatedCharactersEqualTheReference) {
-  std::vector<std::string> characters = {"", "%", "_", "!", "a%", "zz", "中国", "👍🏽", "❤️"};
+  std::vector<std::string> characters = {"",   "%",    "_",        "!",     "a%",
+                                         "zz", "中国", "👍🏽", "❤️"};
   for (const std::string& row : Column("RelatedCharDB", "select relatedChars from related_dict")) {
     const icu::UnicodeString text = DecodeUtf8Lenient(row);
     for (int32_t i = 0; i < text.length(); i = text.moveIndex32(i, 1))
@@ -167,11 +174,13 @@ TEST_F(DifferentialTest, RelatedCharactersEqualTheReference) {
     for (std::uint64_t limit : kLimits) {
       if (scale_ == 0 && limit != kLimits[i % std::size(kLimits)]) continue;
       const auto max_count = static_cast<std::int64_t>(limit);
-      const MessageValue expected = reference_.createXPCArrayForRelatedCharacters(request, max_count);
+      const MessageValue expected =
+          reference_.createXPCArrayForRelatedCharacters(request, max_count);
       const MessageValue actual = indexed_.createXPCArrayForRelatedCharacters(request, max_count);
       if (actual != expected && ++differences <= 5) {
-        ADD_FAILURE() << "\"" << characters[i] << "\" limit " << limit << "\n indexed:   "
-                      << Describe(actual) << "\n reference: " << Describe(expected);
+        ADD_FAILURE() << "\"" << characters[i] << "\" limit " << limit
+                      << "\n indexed:   " << Describe(actual)
+                      << "\n reference: " << Describe(expected);
       }
     }
   }
