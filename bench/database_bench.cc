@@ -214,11 +214,15 @@ int Main(int argc, char** argv) {
   const Figures reference = indexed_only ? Figures{} : Measure("reference", words, false);
 
   std::printf("%-52s %12s %12s %8s\n", "", "reference", "indexed", "ratio");
-  auto row = [&](const char* what, double Figures::*field) {
+  // The ratio says how many times better the indexed rules do: reference / indexed for times,
+  // indexed / reference for the throughput.
+  auto row = [&](const char* what, double Figures::*field, bool higher_is_better = false) {
     const double a = reference.*field;
     const double b = indexed.*field;
-    std::printf("%-52s %12.3f %12.3f %8.1f\n", what, a, b, b > 0 ? a / b : 0.0);
+    const double ratio = higher_is_better ? (a > 0 ? b / a : 0.0) : (b > 0 ? a / b : 0.0);
+    std::printf("%-52s %12.3f %12.3f %8.1f\n", what, a, b, ratio);
   };
+
   row("first search after start, ms (goal <= 50)", &Figures::first);
   std::printf("search, %zu words of 3+ letters, limit 100:\n", words.size());
   row("  p50 ms (goal <= 0.5)", &Figures::words_p50);
@@ -230,7 +234,7 @@ int Main(int argc, char** argv) {
   row("search \"a\", limit 2^63, ms (goal <= 30)", &Figures::a_unlimited);
   row("related characters, limit 100, p50 ms (goal <= 0.3)", &Figures::related_p50);
   row("information record, p50 ms (goal <= 0.3)", &Figures::info_p50);
-  row("8 connections, searches/s (goal >= 3000)", &Figures::parallel_per_second);
+  row("8 connections, searches/s (goal >= 3000)", &Figures::parallel_per_second, true);
   std::printf(
       "resident memory after 10,000 mixed requests: %.1f MB, after 10,000 more: %.1f MB "
       "(goal <= 40, within 5%%)\n",

@@ -138,15 +138,23 @@ std::optional<plist::Value> LMCharacterDatabase::tagsForLanguage(std::string_vie
 
 void LMCharacterDatabase::PrepareSearchIndex() {
   if (rules_ != Rules::kIndexed) return;
-  if (Connection* connection = Open(_charDatabase, "CharacterDB")) SearchIndex(*connection);
+  Connection* connection = Open(_charDatabase, "CharacterDB");
+  if (connection == nullptr) return;
+  preparing_.store(true);
+  SearchIndex(*connection);
 }
 
 const CharacterSearchIndex* LMCharacterDatabase::SearchIndex(Connection& connection) {
   std::call_once(search_index_once_, [&] {
-    {
-      std::lock_guard lock(connection.query_mutex);
-      search_index_ = CharacterSearchIndex::Build(connection.handle, fonts_);
+    // On a connection of its own, so that searches answered by the reference meanwhile (see
+    // createXPCArrayForSearchString) do not wait for the whole table to be read.
+    const char* path = sqlite3_db_filename(connection.handle, "main");
+    sqlite3* db = nullptr;
+    if (path != nullptr && *path != '\0' &&
+        sqlite3_open_v2(path, &db, SQLITE_OPEN_READONLY, nullptr) == SQLITE_OK) {
+      search_index_ = CharacterSearchIndex::Build(db, fonts_);
     }
+    sqlite3_close(db);
     if (search_index_) {
       completion_ = std::thread([this] {
         // Below the requests: they are served from the index as it stands meanwhile.
@@ -154,6 +162,7 @@ const CharacterSearchIndex* LMCharacterDatabase::SearchIndex(Connection& connect
         search_index_->CompleteInBackground(stopping_);
       });
     }
+    search_index_ready_.store(true, std::memory_order_release);
   });
   return search_index_.get();
 }
@@ -197,7 +206,10 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
   // rest.
   if (rules_ == Rules::kIndexed && utf8->find('\0') == std::string::npos &&
       utf8->find('|') == std::string::npos && utf8->size() <= kIndexedSearchMaxBytes) {
-    if (SearchIndex(*connection) != nullptr)
+    // While PrepareSearchIndex() reads the table on its thread, the reference answers (reading
+    // the table takes several times as long as one reference search).
+    const bool wait = search_index_ready_.load(std::memory_order_acquire) || !preparing_.load();
+    if (wait && SearchIndex(*connection) != nullptr)
       return IndexedSearch(*connection, *utf8, text, maxCount);
   }
   return ReferenceSearch(*connection, *utf8, text, maxCount);

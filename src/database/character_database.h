@@ -78,8 +78,9 @@ class LMCharacterDatabase {
   // Stops the indexing thread, then closes the connections that were opened.
   ~LMCharacterDatabase();
 
-  // Opens CharacterDB and reads the search index now, if the rules use one, so that the first
-  // search finds it ready; the rest of the index is completed on a thread of this object.
+  // Opens CharacterDB and reads the search index now, if the rules use one; the rest of the index
+  // is completed on a thread of this object. Searches made while it reads are answered by the
+  // reference rules instead of waiting; without this call the first search reads the index.
   void PrepareSearchIndex();
 
   // Characters whose field 0 ("unam") contains `text`, ignoring case: emoji-font characters
@@ -144,6 +145,8 @@ class LMCharacterDatabase {
   const Rules rules_;
   std::once_flag search_index_once_;
   std::unique_ptr<CharacterSearchIndex> search_index_;  // set once, under search_index_once_
+  std::atomic<bool> search_index_ready_{false};         // search_index_once_ has run
+  std::atomic<bool> preparing_{false};                  // PrepareSearchIndex() was called
   std::once_flag related_index_once_;
   std::unique_ptr<RelatedCharacterIndex> related_index_;  // set once, under related_index_once_
   std::atomic<bool> stopping_{false};
