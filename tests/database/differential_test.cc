@@ -2,7 +2,7 @@
 // every related character, with the limits that matter, outside and inside China. Both databases
 // must reply element for element the same.
 //
-// The suite runs a seeded subset (12 texts, each with the five limits in both countries, and 120
+// The suite runs a seeded subset (6 texts, each with the five limits in both countries, and 120
 // related characters); LUMERIS_DIFFERENTIAL_SCALE=N runs 40 * N search texts and every character
 // of RelatedCharDB with every limit.
 #include <gtest/gtest.h>
@@ -136,13 +136,16 @@ std::vector<std::string> SearchTexts(std::mt19937_64& random, std::size_t count)
 
 TEST_F(DifferentialTest, SearchRepliesEqualTheReference) {
   const std::vector<std::string> texts =
-      SearchTexts(random_, scale_ > 0 ? 40 * static_cast<std::size_t>(scale_) : 12);
+      SearchTexts(random_, scale_ > 0 ? 40 * static_cast<std::size_t>(scale_) : 6);
   ASSERT_FALSE(texts.empty());
   InBothCountries([&] {
     std::size_t differences = 0;
     for (const std::string& text : texts) {
       const icu::UnicodeString request = DecodeUtf8Lenient(text);
       for (std::uint64_t limit : kLimits) {
+        // The subset leaves out the reference's slowest case: a text of one or two bytes, whose
+        // every emoji row it must test, without limit.
+        if (scale_ == 0 && text.size() < 3 && limit >= kLimits[4]) continue;
         const auto max_count = static_cast<std::int64_t>(limit);
         const MessageValue expected = reference_.createXPCArrayForSearchString(request, max_count);
         const MessageValue actual = indexed_.createXPCArrayForSearchString(request, max_count);
