@@ -19,7 +19,9 @@
 // loading happen under one mutex, so each file is opened at most once. SQLite statements are
 // serialized: each connection has its own mutex, held by a request from its query's preparation to
 // its finalization, so at most one query runs on a connection at a time (searches of different
-// connections wait for each other; the font queries inside a search run under that lock too).
+// connections wait for each other). Indexed searches read their immutable index without a lock and
+// take the connection's lock only for the rare row whose LIKE test needs its whole `info` text, so
+// searches from several threads run in parallel.
 //
 // Ownership: every create... result is a new value owned by the caller; sharedDatabase() is
 // borrowed and lives until the process ends.
@@ -28,6 +30,7 @@
 #include <sqlite3.h>
 #include <unicode/unistr.h>
 
+#include <atomic>
 #include <cstdint>
 #include <filesystem>
 #include <functional>
@@ -37,8 +40,11 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <thread>
 
+#include "database/character_search_index.h"
 #include "database/font_queries.h"
+#include "database/related_character_index.h"
 #include "platform/property_list.h"
 #include "service/message_value.h"
 
@@ -57,13 +63,25 @@ class LMCharacterDatabase {
   // fonts. Created on first use, never destroyed.
   static LMCharacterDatabase& sharedDatabase();
 
-  // A database over the resources `lookup` finds, asking `fonts` its font questions. Opens
-  // nothing yet.
-  LMCharacterDatabase(ResourcePathLookup lookup, FontQueries fonts);
+  // How the search and related-characters requests find their rows. Both give the same replies:
+  // kReference runs each request's statement over the whole table, as the rules are written;
+  // kIndexed answers from in-memory indexes read once (character_search_index.h,
+  // related_character_index.h) and stops as soon as no later row can change the reply. The
+  // reference stays for the differential tests and benchmarks, which compare the two.
+  enum class Rules { kIndexed, kReference };
+
+  // A database over the resources `lookup` finds, asking `fonts` its font questions (whose
+  // answers must not change for a string). Opens nothing yet.
+  LMCharacterDatabase(ResourcePathLookup lookup, FontQueries fonts, Rules rules = Rules::kIndexed);
   LMCharacterDatabase(const LMCharacterDatabase&) = delete;
   LMCharacterDatabase& operator=(const LMCharacterDatabase&) = delete;
-  // Closes the connections that were opened.
+  // Stops the indexing thread, then closes the connections that were opened.
   ~LMCharacterDatabase();
+
+  // Opens CharacterDB and reads the search index now, if the rules use one; the rest of the index
+  // is completed on a thread of this object. Searches made while it reads are answered by the
+  // reference rules instead of waiting; without this call the first search reads the index.
+  void PrepareSearchIndex();
 
   // Characters whose field 0 ("unam") contains `text`, ignoring case: emoji-font characters
   // first, at most `maxCount` of each kind as the rules say. Null when CharacterDB cannot be
@@ -96,6 +114,19 @@ class LMCharacterDatabase {
     std::mutex query_mutex;     // held for the whole of one query
   };
 
+  MessageValue ReferenceSearch(Connection& connection, const std::string& utf8,
+                               const icu::UnicodeString& text, std::int64_t maxCount);
+  MessageValue IndexedSearch(Connection& connection, const std::string& utf8,
+                             const icu::UnicodeString& text, std::int64_t maxCount);
+  // Whether the `info` text of `rowid` matches the LIKE `pattern`, as the search statement tests.
+  bool InfoMatchesLike(Connection& connection, sqlite3_int64 rowid, const std::string& pattern);
+  // The search index, read on first use; nullptr when CharacterDB's table cannot be read.
+  const CharacterSearchIndex* SearchIndex(Connection& connection);
+  const RelatedCharacterIndex* RelatedIndex(Connection& connection);
+  // Appends the pieces of one related_dict row as the related-characters rules say.
+  void AppendRelatedPieces(const icu::UnicodeString& row, const icu::UnicodeString& character,
+                           std::int64_t maxCount, std::int64_t& count, MessageValue& result);
+
   // The connection of `name` ("CharacterDB" or "RelatedCharDB"), opened now when its handle is
   // still null; nullptr while the open call produces no handle.
   Connection* Open(Connection& connection, std::string_view name);
@@ -111,6 +142,15 @@ class LMCharacterDatabase {
   Connection _charDatabase;
   Connection _relatedCharDatabase;
   std::unique_ptr<const plist::Dictionary> _languageInfo;  // guarded by open_mutex_; set once
+  const Rules rules_;
+  std::once_flag search_index_once_;
+  std::unique_ptr<CharacterSearchIndex> search_index_;  // set once, under search_index_once_
+  std::atomic<bool> search_index_ready_{false};         // search_index_once_ has run
+  std::atomic<bool> preparing_{false};                  // PrepareSearchIndex() was called
+  std::once_flag related_index_once_;
+  std::unique_ptr<RelatedCharacterIndex> related_index_;  // set once, under related_index_once_
+  std::atomic<bool> stopping_{false};
+  std::thread completion_;  // CharacterSearchIndex::CompleteInBackground
 };
 
 }  // namespace lumeris

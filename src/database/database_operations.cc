@@ -1,7 +1,10 @@
 #include "database/database_operations.h"
 
+#include <thread>
+
 #include "categories/regional_restriction.h"
 #include "database/character_database.h"
+#include "platform/font_coverage.h"
 #include "text/utf8.h"
 
 namespace lumeris {
@@ -28,6 +31,14 @@ void InstallDatabaseOperations(ServiceOperations& operations) {
     return LMCharacterDatabase::sharedDatabase().createXPCDictionaryForCharacterInfo(
         RequestText(text));
   };
+}
+
+void PrepareCharacterDatabaseInBackground() {
+  std::thread([] {
+    LMCharacterDatabase::sharedDatabase().PrepareSearchIndex();
+    // The two font questions build their font lists on first use.
+    DefaultLikeFontDrawsString(icu::UnicodeString(u"a"));
+  }).detach();
 }
 
 }  // namespace lumeris

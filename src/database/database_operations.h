@@ -20,4 +20,9 @@ namespace lumeris {
 // member as it is.
 void InstallDatabaseOperations(ServiceOperations& operations);
 
+// Reads the shared database's search index and loads the fonts on a thread of its own, so that
+// the first search after the service starts finds them ready (a search arriving meanwhile waits
+// for the index). For the service's start.
+void PrepareCharacterDatabaseInBackground();
+
 }  // namespace lumeris

@@ -24,10 +24,16 @@ bool FirstCodePointIsShowable(const char* utf8) {
          !u_hasBinaryProperty(c, UCHAR_DEFAULT_IGNORABLE_CODE_POINT);
 }
 
-std::optional<icu::UnicodeString> ShowableSearchCandidate(const char* utf8) {
+std::optional<icu::UnicodeString> ShowableSearchCandidateIgnoringRegion(const char* utf8) {
   if (!FirstCodePointIsShowable(utf8)) return std::nullopt;
   std::optional<icu::UnicodeString> text = DecodeUtf8(std::string_view(utf8));
-  if (!text || text->isEmpty() || ShouldHideThisCharacter(*text)) return std::nullopt;
+  if (!text || text->isEmpty()) return std::nullopt;
+  return text;
+}
+
+std::optional<icu::UnicodeString> ShowableSearchCandidate(const char* utf8) {
+  std::optional<icu::UnicodeString> text = ShowableSearchCandidateIgnoringRegion(utf8);
+  if (!text || ShouldHideThisCharacter(*text)) return std::nullopt;
   return text;
 }
 

@@ -28,6 +28,8 @@ bool FirstCodePointIsShowable(const char* utf8);
 // The candidate as a string when it passes FirstCodePointIsShowable, is well-formed non-empty
 // UTF-8 and is not hidden by the regional restriction; std::nullopt otherwise.
 std::optional<icu::UnicodeString> ShowableSearchCandidate(const char* utf8);
+// The same tests without the regional one, whose answer can change from one request to the next.
+std::optional<icu::UnicodeString> ShowableSearchCandidateIgnoringRegion(const char* utf8);
 
 // A text prepared for repeated case-insensitive searches (full Unicode case folding). Match
 // positions are indexes into the original text, so a caller can count what precedes a match

@@ -111,22 +111,19 @@ class ColorFont {
   ColorFont(const ColorFont&) = delete;
   ColorFont& operator=(const ColorFont&) = delete;
 
+  // Not cached: a character-map lookup per code point costs less than a cache lookup would,
+  // and the search asks about every row of the character database.
   bool Draws(const icu::UnicodeString& text) {
     std::lock_guard lock(mutex_);
     if (face_ == nullptr) return false;
-    auto [it, inserted] = answers_.try_emplace(CacheKey(text), false);
-    if (inserted) {
-      it->second = CoversEveryCodePoint(
-          text, [&](UChar32 c) { return FT_Get_Char_Index(face_, static_cast<FT_ULong>(c)) != 0; });
-    }
-    return it->second;
+    return CoversEveryCodePoint(
+        text, [&](UChar32 c) { return FT_Get_Char_Index(face_, static_cast<FT_ULong>(c)) != 0; });
   }
 
  private:
   FT_Library library_ = nullptr;
   FT_Face face_ = nullptr;
   std::mutex mutex_;
-  AnswerCache answers_;
 };
 
 // The default sans family's sorted fallback list, untrimmed, so that a font whose characters

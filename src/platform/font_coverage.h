@@ -21,8 +21,8 @@
 // by LoadLumerisFontConfiguration() or by the first query; a missing file is logged and the
 // default configuration is used.
 //
-// Thread-safety: every function may be called from any thread at the same time. Answers are
-// cached per process (per family and string), under a mutex; fonts installed after the first
+// Thread-safety: every function may be called from any thread at the same time. The default-like
+// answers are cached per process (per string), under a mutex; fonts installed after the first
 // query are not seen.
 #pragma once
 

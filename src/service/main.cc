@@ -1,4 +1,5 @@
 // lumeris-fileservice: the file service. Serves until SIGTERM or SIGINT.
+#include "database/database_operations.h"
 #include "platform/font_coverage.h"
 #include "service/server.h"
 #include "service/service_handler.h"
@@ -6,5 +7,6 @@
 int main() {
   // The colour emoji font name must resolve before the first search asks about it.
   lumeris::LoadLumerisFontConfiguration();
+  lumeris::PrepareCharacterDatabaseInBackground();
   return lumeris::ServiceMain(lumeris::ServiceConnectionHandler);
 }

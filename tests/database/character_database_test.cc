@@ -53,7 +53,8 @@ void WriteTable(const std::filesystem::path& path, const std::string& create,
   sqlite3_close(db);
 }
 
-class CharacterDatabaseTest : public ::testing::Test {
+// Every rule is checked with the reference statements and with the indexes.
+class CharacterDatabaseTest : public ::testing::TestWithParam<LMCharacterDatabase::Rules> {
  protected:
   // Writes CharacterDB with (uchr, info) rows; `info_column` names the second column.
   void WriteCharacters(const Rows& rows, const std::string& info_column = "info") {
@@ -90,7 +91,7 @@ class CharacterDatabaseTest : public ::testing::Test {
             if (!std::filesystem::exists(path)) return std::nullopt;
             return path;
           },
-          fonts);
+          fonts, GetParam());
     }
     return *database_;
   }
@@ -118,7 +119,7 @@ class CharacterDatabaseTest : public ::testing::Test {
   std::unique_ptr<LMCharacterDatabase> database_;
 };
 
-TEST_F(CharacterDatabaseTest, SearchRules) {
+TEST_P(CharacterDatabaseTest, SearchRules) {
   WriteCharacters({
       {"♡", Info("white heart suit")},
       {"❤\uFE0F", Info("red heart; heart; HEART")},
@@ -126,6 +127,7 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
       {"ℵ", Info("alef", "heart")},   // only a later field holds the text
       {"ﬀ", Info("ﬀﬀﬀﬀﬀﬀﬀﬀﬀﬀ oak")},  // folding doubles field 0's length before the match
       {"É", Info("ÉCLAIR")},
+      {"Ω", Info("ÉTÉ", "été")},  // LIKE passes on field 1, the second search on field 0
       {"ß", Info("Straße")},
       {"1", Info("100% sure")},
       {"2", Info("100 percent")},
@@ -153,6 +155,7 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
       {"OAK", {"ﬀ"}},
       {"éclair", {}},  // LIKE folds ASCII only
       {"ÉCLAIR", {"É"}},
+      {"été", {"Ω"}},
       {"STRASSE", {}},
       {"STRAßE", {"ß"}},  // LIKE passes "STRA"; the second search folds ß
       {"100%", {"1"}},    // "%" is a wildcard for LIKE only
@@ -166,7 +169,7 @@ TEST_F(CharacterDatabaseTest, SearchRules) {
   EXPECT_THAT(looked_up_, ElementsAre("CharacterDB"));
 }
 
-TEST_F(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest) {
+TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest) {
   WriteCharacters({{"n1", Info("x")},
                    {"e1", Info("x")},
                    {"n2", Info("x")},
@@ -188,7 +191,7 @@ TEST_F(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest
   for (const auto& c : kCases) EXPECT_EQ(Search("x", c.limit), c.expected) << c.limit;
 }
 
-TEST_F(CharacterDatabaseTest, RelatedCharacters) {
+TEST_P(CharacterDatabaseTest, RelatedCharacters) {
   WriteRelated({"aAáÀ", "a", "xyz", "👍👍🏽", "👍🏽👍🏿", "%q", "b_"});
   undrawable_ = {"À"};
   const struct {
@@ -216,7 +219,7 @@ TEST_F(CharacterDatabaseTest, RelatedCharacters) {
   EXPECT_THAT(looked_up_, ElementsAre("RelatedCharDB"));
 }
 
-TEST_F(CharacterDatabaseTest, InformationRecords) {
+TEST_P(CharacterDatabaseTest, InformationRecords) {
   const std::string full = "middle|chuu|jung|zhong|||4|zung1|L|||ㄓㄨㄥ|2.3|||";
   WriteCharacters({
       {"中", full},
@@ -264,13 +267,13 @@ TEST_F(CharacterDatabaseTest, InformationRecords) {
   EXPECT_EQ((*sparse)["swbx"], "");
 }
 
-TEST_F(CharacterDatabaseTest, SecondColumnWithALongNameHoldsNoRecord) {
+TEST_P(CharacterDatabaseTest, SecondColumnWithALongNameHoldsNoRecord) {
   WriteCharacters({{"中", "middle" + std::string(15, '|')}}, "information");
   EXPECT_TRUE(
       Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
 }
 
-TEST_F(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAreNotReopened) {
+TEST_P(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAreNotReopened) {
   EXPECT_THAT(Search("heart", 10), ElementsAre("null"));
   EXPECT_THAT(Related("a", 10), ElementsAre());
   EXPECT_TRUE(
@@ -281,7 +284,7 @@ TEST_F(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAr
   EXPECT_THAT(looked_up_, ElementsAre("CharacterDB", "RelatedCharDB"));
 }
 
-TEST_F(CharacterDatabaseTest, LanguageListIsLoadedOnceFoundAndLookedForUntilThen) {
+TEST_P(CharacterDatabaseTest, LanguageListIsLoadedOnceFoundAndLookedForUntilThen) {
   EXPECT_FALSE(Database().languageForFieldTag("jyom"));
   plist::Value list = plist::Dictionary{
       {"tags", plist::Dictionary{{"jyom", "ja"}}},
@@ -296,6 +299,10 @@ TEST_F(CharacterDatabaseTest, LanguageListIsLoadedOnceFoundAndLookedForUntilThen
   EXPECT_FALSE(Database().languageForFieldTag("unam"));
   EXPECT_FALSE(Database().tagsForLanguage("ko"));
 }
+
+INSTANTIATE_TEST_SUITE_P(Rules, CharacterDatabaseTest,
+                         ::testing::Values(LMCharacterDatabase::Rules::kReference,
+                                           LMCharacterDatabase::Rules::kIndexed));
 
 }  // namespace
 }  // namespace lumeris
