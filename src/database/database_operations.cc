@@ -1,5 +1,8 @@
 #include "database/database_operations.h"
 
+#include <pthread.h>
+#include <signal.h>
+
 #include <thread>
 
 #include "categories/regional_restriction.h"
@@ -34,11 +37,20 @@ void InstallDatabaseOperations(ServiceOperations& operations) {
 }
 
 void PrepareCharacterDatabaseInBackground() {
+  // The thread (and the index completion it starts, which inherits its mask) never takes the
+  // process's signals: the service ends on SIGTERM and SIGINT only through the thread that
+  // waits for them, and a stop signal delivered here would kill the process without removing
+  // its socket.
+  sigset_t all;
+  sigfillset(&all);
+  sigset_t previous;
+  pthread_sigmask(SIG_BLOCK, &all, &previous);
   std::thread([] {
     LMCharacterDatabase::sharedDatabase().PrepareSearchIndex();
     // The two font questions build their font lists on first use.
     DefaultLikeFontDrawsString(icu::UnicodeString(u"a"));
   }).detach();
+  pthread_sigmask(SIG_SETMASK, &previous, nullptr);
 }
 
 }  // namespace lumeris

@@ -21,8 +21,9 @@ namespace lumeris {
 void InstallDatabaseOperations(ServiceOperations& operations);
 
 // Reads the shared database's search index and loads the fonts on a thread of its own, so that
-// the first search after the service starts finds them ready (a search arriving meanwhile waits
-// for the index). For the service's start.
+// the first search after the service starts finds them ready (a search arriving meanwhile is
+// answered by the reference rules). The thread takes none of the process's signals. For the
+// service's start, before the service blocks its stop signals.
 void PrepareCharacterDatabaseInBackground();
 
 }  // namespace lumeris
