@@ -78,15 +78,22 @@ TEST(FormatListsTest, CharactersAndItemsOneLineEach) {
 
 TEST(FormatCharacterInfoTest, PrintsTheSixteenTagsInFieldOrderThenOtherKeys) {
   MessageValue record = MessageValue::MakeDictionary();
+  const char* const tags[] = {"unam", "jyom", "krpi", "spin", "swbx", "swbh", "sbix", "cbai",
+                              "tcan", "tday", "tpin", "tzhu", "rsu1", "rsu2", "rsu3", "rsu4"};
+  const char* const meanings[] = {
+      "names and keywords", "Japanese readings", "Korean reading",     "pinyin (mainland)",
+      "Wubi code",          "Wubi strokes",      "strokes (mainland)", "Cantonese (Jyutping)",
+      "Cangjie code",       "Dayi code",         "pinyin (Taiwan)",    "Zhuyin",
+      "radical-stroke 1",   "radical-stroke 2",  "radical-stroke 3",   "radical-stroke 4"};
   std::string expected = "中\tU+4E2D\n";
-  for (std::size_t i = 0; i < kCharacterInfoTags.size(); ++i) {
+  for (std::size_t i = 0; i < std::size(tags); ++i) {
     // Field 3 is missing and prints empty.
-    expected += std::string(kCharacterInfoTags[i]) + "\t" + std::string(kCharacterInfoMeanings[i]) +
+    expected += std::string(tags[i]) + "\t" + meanings[i] +
                 "\t" + (i == 3 ? "" : "v" + std::to_string(i)) + "\n";
   }
   // Set in reverse order so the output order cannot come from the dictionary.
-  for (std::size_t i = kCharacterInfoTags.size(); i-- > 0;) {
-    if (i != 3) record.Set(std::string(kCharacterInfoTags[i]), MessageValue::String("v" + std::to_string(i)));
+  for (std::size_t i = std::size(tags); i-- > 0;) {
+    if (i != 3) record.Set(tags[i], MessageValue::String("v" + std::to_string(i)));
   }
   record.Set("zzzz", MessageValue::String("extra"));
   EXPECT_EQ(FormatCharacterInfo("中", &record), expected + "zzzz\t\textra\n");

@@ -24,11 +24,11 @@ CharacterInfo Info(Text character, Text font, std::optional<uint32_t> glyph,
 }
 
 icu::UnicodeString Current(const std::string& json) {
-  return icu::UnicodeString(kEntityIDPrefix) + DecodeUtf8Lenient(json);
+  return icu::UnicodeString(u"com.vantorel.lmk:") + DecodeUtf8Lenient(json);
 }
 
 icu::UnicodeString Old(const char16_t* rest) {
-  return icu::UnicodeString(kOldEntityIDPrefix) + icu::UnicodeString(rest);
+  return icu::UnicodeString(u"com.vantorel.Lumeris:") + icu::UnicodeString(rest);
 }
 
 // Reads `id` asking for every out-argument; the glyph starts as a value no reading gives.
@@ -196,6 +196,17 @@ TEST(CharacterInfoFromEntityIDErrors, DamagedJsonIsLoggedAndReadsAsEmpty) {
     EXPECT_NE(log.find(": CharacterInfoFromEntityID failed due to "), std::string::npos) << log;
     EXPECT_TRUE(log.ends_with('\n')) << log;
   }
+}
+
+// The nesting limit is exact: an ID nested to the limit reads, one level more is damaged.
+TEST(CharacterInfoFromEntityIDErrors, NestingIsLimitedToSixtyFourLevels) {
+  auto nested = [](int arrays) {
+    return Current("{\"char\":\"A\",\"x\":" + std::string(arrays, '[') + std::string(arrays, ']') + "}");
+  };
+  EXPECT_EQ(Read(nested(64)).character, u"A");
+  ::testing::internal::CaptureStderr();
+  EXPECT_EQ(Read(nested(65)).character, std::nullopt);
+  EXPECT_NE(::testing::internal::GetCapturedStderr().find("nested deeper than 64 levels"), std::string::npos);
 }
 
 TEST(CharacterInfoFromEntityIDErrors, UnencodableTextLeavesTheInfoUntouched) {

@@ -198,34 +198,5 @@ TEST_F(PreferenceReliabilityTest, WriterKilledAtRandomMomentsNeverTearsTheFile) 
   EXPECT_TRUE(CorruptCopies().empty());
 }
 
-TEST_F(PreferenceReliabilityTest, ValueSynchronizedInOneProcessIsSeenByAnotherAtItsNextRead) {
-  PreferenceStore store;
-  EXPECT_EQ(IntegerOf(store, "shared"), 0);
-  ASSERT_TRUE(Succeeded(StartWriter([](PreferenceStore& child) {
-    Set(child, "shared", Value(7));
-    return Synchronize(child);
-  })));
-  EXPECT_EQ(IntegerOf(store, "shared"), 7);
-}
-
-TEST_F(PreferenceReliabilityTest, CorruptFileIsKeptAsideAndTheDomainIsUsableAgain) {
-  fs::create_directories(DomainFile().parent_path());
-  std::ofstream(DomainFile()) << "<plist><dict><key>torn";
-  ASSERT_TRUE(Succeeded(StartWriter([](PreferenceStore& child) {
-    Set(child, "fresh", Value("yes"));
-    return Synchronize(child);
-  })));
-  std::vector<fs::path> copies = CorruptCopies();
-  ASSERT_EQ(copies.size(), 1u);
-  std::ifstream kept(copies[0]);
-  EXPECT_EQ(std::string(std::istreambuf_iterator<char>(kept), std::istreambuf_iterator<char>()),
-            "<plist><dict><key>torn");
-  PreferenceStore store;
-  ASSERT_TRUE(Synchronize(store));
-  std::optional<Value> fresh = store.CopyValue("fresh", kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
-  ASSERT_TRUE(fresh.has_value());
-  EXPECT_EQ(*fresh->AsString(), "yes");
-}
-
 }  // namespace
 }  // namespace lumeris

@@ -19,7 +19,7 @@ class LargeViewerTest : public testing::ServiceTest {
     if (path) request.Set("path", MessageValue::String(*path));
     std::optional<MessageValue> reply = sendRequest(request);
     EXPECT_TRUE(reply && reply->AsDictionary() && reply->AsDictionary()->empty()) << "an empty reply";
-    const plist::Dictionary domain = testing::StoredDomain(kInputMethodDomain);
+    const plist::Dictionary domain = testing::StoredDomain("com.vantorel.SorvendiIM");
     auto found = domain.find(kKey);
     if (found == domain.end()) return std::nullopt;
     return found->second;
@@ -27,11 +27,11 @@ class LargeViewerTest : public testing::ServiceTest {
 };
 
 TEST_F(LargeViewerTest, ThePathIsWrittenBeforeTheReplyAndRemovedWithoutOne) {
-  testing::SeedDomain(kInputMethodDomain, {{"VTRecentItems", plist::Array{}}});
+  testing::SeedDomain("com.vantorel.SorvendiIM", {{"VTRecentItems", plist::Array{}}});
   EXPECT_EQ(openAndReadBack("/home/user/first"), plist::Value("/home/user/first"));
   EXPECT_EQ(openAndReadBack("/tmp/second path"), plist::Value("/tmp/second path"));
   EXPECT_EQ(openAndReadBack(std::nullopt), std::nullopt);
-  EXPECT_TRUE(testing::StoredDomain(kInputMethodDomain).contains("VTRecentItems")) << "other keys stay";
+  EXPECT_TRUE(testing::StoredDomain("com.vantorel.SorvendiIM").contains("VTRecentItems")) << "other keys stay";
 }
 
 }  // namespace

@@ -98,150 +98,65 @@ class StoreServiceTest : public ServiceTest {
   std::optional<RawConnection> connection_;
 };
 
-TEST_F(StoreServiceTest, AddingAnExistingItemMovesItToTheFrontWithTheNewText) {
-  for (const std::string& item : {PlainID("a"), EmojiID(kThumbsUp), PlainID("b")}) add(item);
-  add(EmojiID(kThumbsUpDark));
-  EXPECT_THAT(read("recents"), Optional(ElementsAre(EmojiID(kThumbsUpDark), PlainID("b"), PlainID("a"))));
-  EXPECT_EQ(notifications(), 4u);
-  EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
-              Optional(ElementsAre(EmojiID(kThumbsUpDark), PlainID("b"), PlainID("a"))));
-}
-
-TEST_F(StoreServiceTest, TheDefaultIdentifierConvertsTheOlderListsExactlyOnce) {
-  SeedDomain(kInputMethodDomain, {{"VTRecentItems", plist::Array{plist::Dictionary{{"String", "R"}}}}});
-  SeedDomain(kOlderServerDomain, {{"SorvexFavorites", plist::Array{plist::Dictionary{{"String", "F"}}}}});
-
-  MessageValue first = readAll(std::string(kDefaultDataStorageIdentifier));
-  EXPECT_THAT(ReplyList(first, "recents"), Optional(ElementsAre(PlainID("R"))));
-  EXPECT_THAT(ReplyList(first, "favorites"), Optional(ElementsAre(PlainID("F"))));
-  EXPECT_EQ(StoredValue("VTRecentsConverted"), plist::Value(true));
-  EXPECT_EQ(StoredValue("VTFavoritesConverted"), plist::Value(true));
-  EXPECT_EQ(notifications(), 1u) << "storing the converted recents notifies; favourites do not";
-
-  set("recents", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
-  set("favorites", MessageValue::Null(), std::string(kDefaultDataStorageIdentifier));
-  for (const std::string& identifier : {std::string(kDefaultDataStorageIdentifier), std::string("other.identifier")}) {
-    MessageValue again = readAll(identifier);
-    EXPECT_TRUE(again.Find("recents")->is_null()) << identifier;
-    EXPECT_TRUE(again.Find("favorites")->is_null()) << identifier;
-  }
-  EXPECT_FALSE(StoredValue(StoreKey(kRecentsKeyPrefix, "other.identifier")));
-}
-
-TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstRecentsReadNotByAFavoritesRead) {
-  SeedStore({{"Favorites:test.identifier", plist::Array{"f"}}, {"Leftover", 1}});
-  EXPECT_THAT(read("favorites"), Optional(ElementsAre("f")));
-  EXPECT_TRUE(StoredDomain().contains("Leftover"));
-  EXPECT_FALSE(read("recents"));
-  EXPECT_FALSE(read("favorites"));
-  EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}}}));
-}
-
-TEST_F(StoreServiceTest, AnUnversionedDomainIsWipedByTheFirstWrite) {
-  SeedStore({{"Recents:test.identifier", plist::Array{"r"}}, {"Leftover", 1}});
-  set("favorites", Strings({"f"}));
-  settle();
-  EXPECT_EQ(StoredDomain(), (plist::Dictionary{{"version", std::int64_t{1}},
-                                                {"Favorites:test.identifier", plist::Array{"f"}}}));
-  EXPECT_EQ(notifications(), 0u);
-}
-
-TEST_F(StoreServiceTest, HorseRacingWithAModifierIsReadPlainWhileTheStoredTextKeepsIt) {
-  set("recents", Strings({PlainID(kHorseRacingLight), PlainID("a")}));
-  EXPECT_THAT(read("recents"), Optional(ElementsAre(PlainID(kHorseRacing), PlainID("a"))));
-  EXPECT_THAT(StoredList(StoreKey(kRecentsKeyPrefix, kId)),
-              Optional(ElementsAre(PlainID(kHorseRacingLight), PlainID("a"))));
-}
-
-TEST_F(StoreServiceTest, StoringAnEmptyRecentsListRemovesTheSkinTonesAndNotifiesOnce) {
-  set("recents", Strings({EmojiID(kThumbsUpMedium)}));
-  EXPECT_EQ(notifications(), 1u);
-  ASSERT_TRUE(StoredValue(StoreKey(kSkinTonesKeyPrefix, kId)));
-
-  MessageValue only_integers = MessageValue::MakeArray();
-  only_integers.Append(MessageValue::Uint64(7));
-  set("recents", only_integers);
-  EXPECT_EQ(notifications(), 1u);
-  EXPECT_FALSE(StoredValue(StoreKey(kSkinTonesKeyPrefix, kId)));
-  EXPECT_EQ(StoredValue(StoreKey(kRecentsKeyPrefix, kId)), plist::Value(plist::Array{}));
-  MessageValue reply = readAll();
-  EXPECT_TRUE(reply.Find("recents")->is_null());
-  EXPECT_EQ(reply.Find("skintones"), nullptr);
-}
-
-TEST_F(StoreServiceTest, SetSkinToneRecordsOnlySkinToneEmojiInTheEmojiFont) {
-  struct Case {
+// Every store command through the service in one history: what each one notifies, then the four
+// values the panel reads back and the keys in the file. The rules behind each step are shown
+// request by request in the store and dispatch tests; this shows the wiring.
+TEST_F(StoreServiceTest, EveryStoreCommandNotifiesAndIsReadBackFromTheFile) {
+  readAll();  // versions the domain, as the panel's first read does
+  auto add_request = [](std::string item, std::optional<std::string> identifier) {
+    MessageValue request = Command("add", {{"target", Str("recents")}, {"item", Str(std::move(item))}});
+    if (identifier) request.Set("identifier", Str(*identifier));
+    return request;
+  };
+  auto set_request = [](std::string target, const StringVector& items) {
+    return Command("set", {{"target", Str(std::move(target))}, {"array", Strings(items)}, {"identifier", Str(kId)}});
+  };
+  auto skin_tone = [](std::string item) {
+    return Command("set_skintone", {{"item", Str(std::move(item))}, {"identifier", Str(kId)}});
+  };
+  auto state = [](std::string_view data) {
+    return Command("save_state", {{"data", MessageValue::DataFromBytes(data)}, {"application", Str("app")}});
+  };
+  const std::string other_font =
+      "com.vantorel.lmk:{\"char\":\"" + std::string(kThumbsUpDark) + "\",\"font\":\"Courier\"}";
+  const struct {
     const char* name;
-    std::string item;
-    std::optional<std::string> skintones;  // the reply's "skintones" afterwards
+    MessageValue request;
     std::size_t notifications;
+  } steps[] = {
+      {"add", add_request(PlainID("a"), kId), 1},
+      {"add without identifier", add_request(PlainID("x"), std::nullopt), 0},
+      {"set recents", set_request("recents", {EmojiID(kThumbsUp), PlainID("a")}), 1},
+      {"add an existing item with new text", add_request(EmojiID(kThumbsUpMedium), kId), 1},
+      {"set favorites", set_request("favorites", {PlainID("f1"), PlainID("f2")}), 0},
+      {"skin tone in the emoji font", skin_tone(EmojiID(kThumbsUpMedium)), 1},
+      {"skin tone in another font", skin_tone(other_font), 0},
+      {"state without the global member", state(R"({"tab":1})"), 0},
+      {"state with the global member", state(R"({"VTGlobalEmojiDiversityDescribed":"g"})"), 1},
+      {"state that is not JSON", state("not json"), 0},
   };
-  const std::string thumbs = std::string("{\"") + kThumbsUp + "\":\"";
-  const Case cases[] = {
-      {"emoji font, skin tone", EmojiID(kThumbsUpMedium), thumbs + kThumbsUpMedium + "\"}", 1},
-      {"other font", "com.vantorel.lmk:{\"char\":\"" + std::string(kThumbsUpDark) + "\",\"font\":\"Courier\"}",
-       thumbs + kThumbsUpMedium + "\"}", 0},
-      {"no skin tone", EmojiID(kThumbsUp), thumbs + kThumbsUp + "\"}", 1},
-      {"empty", "", std::nullopt, 1},
-  };
-  // Writing the history runs no version check, so the first recents read of an unversioned
-  // domain would wipe it: version the domain first, as the panel's first read does.
-  readAll();
-  for (const Case& c : cases) {
-    send(Command("set_skintone", {{"item", Str(c.item)}, {"identifier", Str(kId)}}));
-    EXPECT_EQ(notifications(), c.notifications) << c.name;
-    EXPECT_EQ(Payload(readAll(), "skintones"), c.skintones) << c.name;
+  for (const auto& step : steps) {
+    send(step.request);
+    EXPECT_EQ(notifications(), step.notifications) << step.name;
   }
-}
 
-TEST_F(StoreServiceTest, SavingOnlyTheGlobalMemberKeepsTheApplicationsStateAndNotifies) {
-  saveState(R"({"tab":1})");
-  EXPECT_EQ(notifications(), 0u);
-  saveState(R"({"VTGlobalEmojiDiversityDescribed":true})");
-  EXPECT_EQ(notifications(), 1u);
-  EXPECT_EQ(Payload(readAll(), "state"), R"({"VTGlobalEmojiDiversityDescribed":true,"tab":1})");
-  EXPECT_EQ(Payload(readAll(kId, "other.app"), "state"), R"({"VTGlobalEmojiDiversityDescribed":true})");
-}
+  const MessageValue reply = readAll();
+  EXPECT_THAT(ReplyList(reply, "recents"), Optional(ElementsAre(EmojiID(kThumbsUpMedium), PlainID("a"))));
+  EXPECT_THAT(ReplyList(reply, "favorites"), Optional(ElementsAre(PlainID("f1"), PlainID("f2"))));
+  EXPECT_THAT(read("favorites"), Optional(ElementsAre(PlainID("f1"), PlainID("f2"))));
+  EXPECT_EQ(Payload(reply, "skintones"), "{\"" + std::string(kThumbsUp) + "\":\"" + kThumbsUpMedium + "\"}");
+  EXPECT_EQ(Payload(reply, "state"), R"({"VTGlobalEmojiDiversityDescribed":"g","tab":1})");
+  EXPECT_EQ(Payload(readAll(kId, "other.app"), "state"), R"({"VTGlobalEmojiDiversityDescribed":"g"})");
+  StringVector keys;
+  for (const auto& [key, value] : StoredDomain()) keys.push_back(key);
+  EXPECT_THAT(keys, ElementsAre("Favorites:test.identifier", "Recents:test.identifier", "SkinTones:test.identifier",
+                                "State:app", "VTGlobalEmojiDiversityDescribed", "version"));
 
-TEST_F(StoreServiceTest, AnEmptyObjectTextThatIsNotJsonOrANullChangeNothing) {
-  saveState(R"({"tab":1})");
-  settle();
-  const plist::Dictionary before = StoredDomain();
-  for (std::string_view data : {R"({})", "not json", R"({"tab":null})", R"([1])"}) saveState(data);
-  EXPECT_EQ(notifications(), 0u);
-  EXPECT_EQ(StoredDomain(), before);
-  EXPECT_EQ(Payload(readAll(), "state"), R"({"tab":1})");
-}
-
-TEST_F(StoreServiceTest, ReadRecentsFavoritesReturnsTheFourValues) {
-  MessageValue empty = readAll();
-  EXPECT_TRUE(empty.Find("recents")->is_null());
-  EXPECT_TRUE(empty.Find("favorites")->is_null());
-  EXPECT_EQ(empty.Find("skintones"), nullptr);
-  EXPECT_EQ(Payload(empty, "state"), "{}");
-
-  add(EmojiID(kThumbsUpMedium));
-  set("favorites", Strings({PlainID("f1"), PlainID("f2")}));
-  saveState(R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})");
-  MessageValue full = readAll();
-  EXPECT_THAT(ReplyList(full, "recents"), Optional(ElementsAre(EmojiID(kThumbsUpMedium))));
-  EXPECT_THAT(ReplyList(full, "favorites"), Optional(ElementsAre(PlainID("f1"), PlainID("f2"))));
-  EXPECT_EQ(Payload(full, "skintones"),
-            "{\"" + std::string(kThumbsUp) + "\":\"" + kThumbsUpMedium + "\"}");
-  EXPECT_EQ(Payload(full, "state"), R"({"VTGlobalEmojiDiversityDescribed":"g","mode":"grid"})");
-}
-
-TEST_F(StoreServiceTest, RequestsWithoutIdentifierReadNothingAndWriteNothing) {
-  set("recents", Strings({"kept"}));
-  settle();
-  const plist::Dictionary before = StoredDomain();
-  send(Command("add", {{"target", Str("recents")}, {"item", Str("x")}}));
-  send(Command("set", {{"target", Str("recents")}, {"array", Strings({"y"})}}));
-  send(Command("save_state", {{"data", MessageValue::DataFromBytes(R"({"a":1})")}}));
-  MessageValue reply = ask(Command("read_recents_favorites"));
-  EXPECT_TRUE(reply.Find("recents")->is_null());
-  EXPECT_EQ(Payload(reply, "state"), "{}");
-  EXPECT_EQ(StoredDomain(), before);
+  set("recents", Strings({}));
+  EXPECT_EQ(notifications(), 1u) << "an empty recents list";
+  const MessageValue emptied = readAll();
+  EXPECT_TRUE(emptied.Find("recents")->is_null());
+  EXPECT_EQ(emptied.Find("skintones"), nullptr) << "an empty recents list removes the skin tones";
 }
 
 // Another program removes the file (as `lumeris defaults delete` does) or replaces it: every read
@@ -250,13 +165,13 @@ TEST_F(StoreServiceTest, RequestsWithoutIdentifierReadNothingAndWriteNothing) {
 TEST_F(StoreServiceTest, ReadsSeeTheFileAsItIsNowAfterAnOutsideResetOrReplace) {
   set("favorites", Strings({"before"}));
   EXPECT_FALSE(read("recents"));
-  std::filesystem::remove(DomainFile(kStoreDomain));
+  std::filesystem::remove(DomainFile("com.vantorel.Lumeris"));
   set("favorites", Strings({"after"}));
   EXPECT_FALSE(read("recents"));
   EXPECT_THAT(read("favorites"), Optional(ElementsAre("after")));
-  EXPECT_EQ(StoredValue(kStorageVersionKey), plist::Value(1));
+  EXPECT_EQ(StoredValue("version"), plist::Value(1));
 
-  SeedStore({{"version", 1}, {StoreKey(kFavoritesKeyPrefix, kId), plist::Array{"seeded"}}});
+  SeedStore({{"version", 1}, {"Favorites:test.identifier", plist::Array{"seeded"}}});
   EXPECT_THAT(read("favorites"), Optional(ElementsAre("seeded")));
 }
 
@@ -277,7 +192,7 @@ TEST_F(StoreServiceTest, TextThatDoesNotConvertIsAnsweredAsStoredBeforeAndAfterA
   ASSERT_TRUE(service_.Start(socket_path_));
   connection_.emplace(Connect());
   EXPECT_EQ(readAll(), before);
-  EXPECT_THAT(StoredList(StoreKey(kFavoritesKeyPrefix, kId)), Optional(ElementsAre("ok")));
+  EXPECT_THAT(StoredList("Favorites:test.identifier"), Optional(ElementsAre("ok")));
 }
 
 // Eight connections add distinct items to one identifier at the same time while a ninth stores
@@ -295,7 +210,7 @@ TEST_F(StoreServiceTest, ConcurrentAddsKeepEveryItemAndOtherKeys) {
   std::thread watcher([&] {
     while (adding) {
       // One read decides: a file that appears between two looks is not torn.
-      const FileContents file = PreferencesFileSystem().Read(DomainFile(kStoreDomain));
+      const FileContents file = PreferencesFileSystem().Read(DomainFile("com.vantorel.Lumeris"));
       if (file.status == ReadStatus::kOk && !plist::ParsePropertyList(file.bytes)) ++torn_reads;
     }
   });

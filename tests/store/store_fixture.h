@@ -65,10 +65,10 @@ inline void SeedDomain(std::string_view domain, const plist::Dictionary& content
       .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
   std::filesystem::rename(temporary, path);
 }
-inline void SeedStore(const plist::Dictionary& contents) { SeedDomain(kStoreDomain, contents); }
+inline void SeedStore(const plist::Dictionary& contents) { SeedDomain("com.vantorel.Lumeris", contents); }
 
 // The file of `domain` as it is on disk (empty when missing or unreadable).
-inline plist::Dictionary StoredDomain(std::string_view domain = kStoreDomain) {
+inline plist::Dictionary StoredDomain(std::string_view domain = "com.vantorel.Lumeris") {
   std::optional<plist::Value> file = plist::ReadPropertyListFile(DomainFile(domain));
   return file && file->AsDictionary() ? *file->AsDictionary() : plist::Dictionary{};
 }

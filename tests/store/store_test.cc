@@ -23,6 +23,7 @@ using ::testing::ElementsAre;
 using ::testing::Optional;
 
 constexpr char kGlobal[] = "VTGlobalEmojiDiversityDescribed";
+constexpr char kDefaultIdentifier[] = "com.vantorel.Lumeris.DefaultDataStorage";
 
 TEST_F(StoreTest, UnversionedDomainIsWipedOnlyByTheOperationsThatCheck) {
   const struct {
@@ -42,12 +43,12 @@ TEST_F(StoreTest, UnversionedDomainIsWipedOnlyByTheOperationsThatCheck) {
   for (const auto& c : cases) {
     SCOPED_TRACE(c.name);
     SeedStore({{"Recents:old", plist::Array{"x"}}, {"Leftover", 3}});
-    CFPreferencesAppSynchronize(kStoreDomain);  // the view a fresh process would load
+    CFPreferencesAppSynchronize("com.vantorel.Lumeris");  // the view a fresh process would load
     c.operation();
     // Whatever the operation left pending (a wipe included) reaches the file with the probe.
-    CFPreferencesAppSynchronize(kStoreDomain);
-    CFPreferencesSetAppValue("Probe", plist::Value(true), kStoreDomain);
-    CFPreferencesAppSynchronize(kStoreDomain);
+    CFPreferencesAppSynchronize("com.vantorel.Lumeris");
+    CFPreferencesSetAppValue("Probe", plist::Value(true), "com.vantorel.Lumeris");
+    CFPreferencesAppSynchronize("com.vantorel.Lumeris");
     const plist::Dictionary domain = StoredDomain();
     EXPECT_EQ(domain.contains("Leftover"), !c.wipes);
     EXPECT_EQ(domain.contains("Recents:old"), !c.wipes);
@@ -198,7 +199,7 @@ plist::Array OldItems(const StringVector& characters) {
 }
 
 TEST_F(StoreTest, TheDefaultIdentifierConvertsOlderRecentsOnceAndOthersNever) {
-  SeedDomain(kInputMethodDomain,
+  SeedDomain("com.vantorel.SorvendiIM",
              {{"VTRecentItems", plist::Array{plist::Dictionary{{"EntityID", "kept-as-is"}},
                                              plist::Dictionary{{"String", "A"}, {"Font", "Courier"}}}},
               {"VTFavorites", OldItems({"F"})}});
@@ -207,15 +208,15 @@ TEST_F(StoreTest, TheDefaultIdentifierConvertsOlderRecentsOnceAndOthersNever) {
   EXPECT_FALSE(StoredValue("VTRecentsConverted"));
   EXPECT_FALSE(StoredValue("VTFavoritesConverted"));
 
-  const std::string key = StoreKey(kRecentsKeyPrefix, kDefaultDataStorageIdentifier);
-  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultDataStorageIdentifier)),
+  const std::string key = "Recents:com.vantorel.Lumeris.DefaultDataStorage";
+  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultIdentifier)),
               Optional(ElementsAre("kept-as-is", PlainID("A"))));
   EXPECT_THAT(StoredList(key), Optional(ElementsAre("kept-as-is", PlainID("A"))));
   EXPECT_EQ(StoredValue("VTRecentsConverted"), plist::Value(true));
   EXPECT_EQ(posts(), 1);
-  SetRecentsIDArray(std::nullopt, kDefaultDataStorageIdentifier);
-  EXPECT_FALSE(CopyRecentsIDArray(kDefaultDataStorageIdentifier));
-  EXPECT_TRUE(StoredDomain(kInputMethodDomain).contains("VTRecentItems"));
+  SetRecentsIDArray(std::nullopt, kDefaultIdentifier);
+  EXPECT_FALSE(CopyRecentsIDArray(kDefaultIdentifier));
+  EXPECT_TRUE(StoredDomain("com.vantorel.SorvendiIM").contains("VTRecentItems"));
 }
 
 TEST_F(StoreTest, FavoritesComeFromTheInputMethodFirstThenTheOlderServerWithoutNotifying) {
@@ -225,11 +226,11 @@ TEST_F(StoreTest, FavoritesComeFromTheInputMethodFirstThenTheOlderServerWithoutN
   } cases[] = {{true, {PlainID("F")}}, {false, {PlainID("S"), PlainID("T")}}};
   for (const auto& c : cases) {
     SeedStore({{"version", 1}});
-    SeedDomain(kOlderServerDomain, {{"SorvexFavorites", OldItems({"S", "T"})}});
-    SeedDomain(kInputMethodDomain, c.input_method ? plist::Dictionary{{"VTFavorites", OldItems({"F"})}}
+    SeedDomain("com.vantorel.SorvexServer", {{"SorvexFavorites", OldItems({"S", "T"})}});
+    SeedDomain("com.vantorel.SorvendiIM", c.input_method ? plist::Dictionary{{"VTFavorites", OldItems({"F"})}}
                                                   : plist::Dictionary{});
-    EXPECT_EQ(StringsOf(CopyFavoritesIDArray(kDefaultDataStorageIdentifier)), c.expected);
-    EXPECT_EQ(StoredList(StoreKey(kFavoritesKeyPrefix, kDefaultDataStorageIdentifier)), c.expected);
+    EXPECT_EQ(StringsOf(CopyFavoritesIDArray(kDefaultIdentifier)), c.expected);
+    EXPECT_EQ(StoredList("Favorites:com.vantorel.Lumeris.DefaultDataStorage"), c.expected);
     EXPECT_EQ(StoredValue("VTFavoritesConverted"), plist::Value(true));
   }
   EXPECT_EQ(posts(), 0);
@@ -237,20 +238,20 @@ TEST_F(StoreTest, FavoritesComeFromTheInputMethodFirstThenTheOlderServerWithoutN
 
 TEST_F(StoreTest, WithNoOlderListsTheConversionIsTriedOnce) {
   SeedStore({{"version", 1}});
-  EXPECT_FALSE(CopyFavoritesIDArray(kDefaultDataStorageIdentifier));
-  EXPECT_FALSE(CopyRecentsIDArray(kDefaultDataStorageIdentifier));
+  EXPECT_FALSE(CopyFavoritesIDArray(kDefaultIdentifier));
+  EXPECT_FALSE(CopyRecentsIDArray(kDefaultIdentifier));
   EXPECT_EQ(StoredValue("VTFavoritesConverted"), plist::Value(true));
   EXPECT_EQ(StoredValue("VTRecentsConverted"), plist::Value(true));
-  SeedDomain(kInputMethodDomain, {{"VTRecentItems", OldItems({"A"})}, {"VTFavorites", OldItems({"F"})}});
-  EXPECT_FALSE(CopyFavoritesIDArray(kDefaultDataStorageIdentifier));
-  EXPECT_FALSE(CopyRecentsIDArray(kDefaultDataStorageIdentifier));
+  SeedDomain("com.vantorel.SorvendiIM", {{"VTRecentItems", OldItems({"A"})}, {"VTFavorites", OldItems({"F"})}});
+  EXPECT_FALSE(CopyFavoritesIDArray(kDefaultIdentifier));
+  EXPECT_FALSE(CopyRecentsIDArray(kDefaultIdentifier));
 }
 
 TEST_F(StoreTest, OlderElementsOfOtherTypesConvertToEmptyItems) {
   SeedStore({{"version", 1}});
-  SeedDomain(kInputMethodDomain,
+  SeedDomain("com.vantorel.SorvendiIM",
              {{"VTRecentItems", plist::Array{"text", plist::Dictionary{{"String", 5}, {"Glyph", 12}, {"Font", "F"}}}}});
-  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultDataStorageIdentifier)),
+  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultIdentifier)),
               Optional(ElementsAre("com.vantorel.lmk:{}", "com.vantorel.lmk:{\"font\":\"F\",\"glyph\":12}")));
 }
 
