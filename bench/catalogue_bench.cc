@@ -38,8 +38,8 @@
 #include "platform/system_root.h"
 #include "service/socket_path.h"
 #include "service/wire.h"
+#include "bench_service.h"
 
-extern char** environ;
 
 namespace lumeris {
 namespace {
@@ -70,69 +70,8 @@ const Setup& GetSetup() {
   return setup;
 }
 
-// The service in a scratch runtime directory, for the whole process.
-class BenchService {
- public:
-  static BenchService& Get() {
-    static BenchService service;
-    return service;
-  }
-  ServiceClient* client() { return client_.get(); }
-  ~BenchService() {
-    client_.reset();
-    if (pid_ > 0) {
-      kill(pid_, SIGTERM);
-      waitpid(pid_, nullptr, 0);
-    }
-    std::filesystem::remove_all(root_);
-  }
-
- private:
-  BenchService() {
-    GetSetup();
-    std::string pattern = (std::filesystem::temp_directory_path() / "lumeris-catalogue-bench-XXXXXX").string();
-    root_ = mkdtemp(pattern.data());
-    chmod(root_.c_str(), 0700);
-    setenv("XDG_RUNTIME_DIR", root_.c_str(), 1);
-    const char* program = getenv("LUMERIS_FILESERVICE");
-    std::string path = program && *program ? program : LUMERIS_BENCH_FILESERVICE;
-    char* argv[] = {path.data(), nullptr};
-    if (posix_spawn(&pid_, path.c_str(), nullptr, nullptr, argv, environ) != 0) pid_ = -1;
-    ServiceClientOptions options;
-    options.socket_path = ServiceSocketPath();
-    options.start_on_demand = false;
-    for (const auto deadline = Clock::now() + std::chrono::seconds(5); !client_ && Clock::now() < deadline;) {
-      client_ = ServiceClient::Connect(options);
-      if (!client_) std::this_thread::sleep_for(std::chrono::milliseconds(5));
-    }
-  }
-
-  std::filesystem::path root_;
-  pid_t pid_ = -1;
-  std::unique_ptr<ServiceClient> client_;
-};
-
-// Times each iteration of `body` and reports the p50 and p90 as counters.
-template <typename Body>
-void TimeIterations(benchmark::State& state, Body body) {
-  std::vector<double> micros;
-  for (auto _ : state) {
-    const auto start = Clock::now();
-    if (!body()) {
-      state.SkipWithError("no answer");
-      return;
-    }
-    const std::chrono::duration<double> elapsed = Clock::now() - start;
-    state.SetIterationTime(elapsed.count());
-    micros.push_back(elapsed.count() * 1e6);
-  }
-  std::sort(micros.begin(), micros.end());
-  if (micros.empty()) return;
-  state.counters["p50_us"] = micros[micros.size() / 2];
-  state.counters["p90_us"] = micros[micros.size() * 9 / 10];
-}
-
 void BM_RoundTrip(benchmark::State& state) {
+  GetSetup();  // the root and language reach the service only when set before it starts
   ServiceClient* client = BenchService::Get().client();
   if (client == nullptr) return state.SkipWithError("no service");
   MessageValue names = MessageValue::MakeArray();

@@ -33,78 +33,13 @@
 #include "client/service_client.h"
 #include "platform/property_list_io.h"
 #include "service/socket_path.h"
+#include "bench_service.h"
 #include "text/utf8.h"
-
-extern char** environ;
 
 namespace lumeris {
 namespace {
 
 using Clock = std::chrono::steady_clock;
-
-// A scratch user environment and the service program running in it, for the whole process.
-class BenchService {
- public:
-  static BenchService& Get() {
-    static BenchService service;
-    return service;
-  }
-  ServiceClient* client() { return client_.get(); }
-  const std::filesystem::path& root() const { return root_; }
-
-  ~BenchService() {
-    Stop();
-    std::filesystem::remove_all(root_);
-  }
-
-  // Ends the service and starts a new one, which has nothing loaded.
-  bool Restart() {
-    Stop();
-    Start();
-    return client_ != nullptr;
-  }
-
- private:
-  void Stop() {
-    client_.reset();
-    if (pid_ > 0) {
-      kill(pid_, SIGTERM);
-      waitpid(pid_, nullptr, 0);
-    }
-    pid_ = -1;
-  }
-
-  BenchService() {
-    std::string pattern = (std::filesystem::temp_directory_path() / "lumeris-store-bench-XXXXXX").string();
-    root_ = mkdtemp(pattern.data());
-    for (const char* sub : {"home", "config", "runtime"}) std::filesystem::create_directories(root_ / sub);
-    chmod((root_ / "runtime").c_str(), 0700);
-    setenv("HOME", (root_ / "home").c_str(), 1);
-    setenv("XDG_CONFIG_HOME", (root_ / "config").c_str(), 1);
-    setenv("XDG_RUNTIME_DIR", (root_ / "runtime").c_str(), 1);
-    Start();
-  }
-
-  void Start() {
-    const char* program = getenv("LUMERIS_FILESERVICE");
-    std::string path = program && *program ? program : LUMERIS_BENCH_FILESERVICE;
-    char* argv[] = {path.data(), nullptr};
-    if (posix_spawn(&pid_, path.c_str(), nullptr, nullptr, argv, environ) != 0) pid_ = -1;
-
-    ServiceClientOptions options;
-    options.socket_path = ServiceSocketPath();
-    options.start_on_demand = false;
-    const auto deadline = Clock::now() + std::chrono::seconds(5);
-    while (!client_ && Clock::now() < deadline) {
-      client_ = ServiceClient::Connect(options);
-      if (!client_) std::this_thread::sleep_for(std::chrono::milliseconds(5));
-    }
-  }
-
-  std::filesystem::path root_;
-  pid_t pid_ = -1;
-  std::unique_ptr<ServiceClient> client_;
-};
 
 MessageValue Request(std::string command, std::vector<std::pair<std::string, MessageValue>> more) {
   MessageValue request = MessageValue::MakeDictionary();
@@ -142,26 +77,6 @@ bool Fence(ServiceClient& client) {
                                 {"identifier", MessageValue::String("bench.fence")}}),
                std::chrono::seconds(30))
       .has_value();
-}
-
-// Times each iteration of `body` and reports the p50 and p90 as counters.
-template <typename Body>
-void TimeIterations(benchmark::State& state, Body body) {
-  std::vector<double> micros;
-  for (auto _ : state) {
-    const auto start = Clock::now();
-    if (!body()) {
-      state.SkipWithError("the service did not answer");
-      return;
-    }
-    const std::chrono::duration<double> elapsed = Clock::now() - start;
-    state.SetIterationTime(elapsed.count());
-    micros.push_back(elapsed.count() * 1e6);
-  }
-  std::sort(micros.begin(), micros.end());
-  if (micros.empty()) return;
-  state.counters["p50_us"] = micros[micros.size() / 2];
-  state.counters["p90_us"] = micros[micros.size() * 9 / 10];
 }
 
 void BM_AddRoundTrip(benchmark::State& state) {
