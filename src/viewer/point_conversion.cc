@@ -4,14 +4,10 @@
 #include <memory>
 #include <optional>
 
+#include "viewer/xcb_reply.h"
+
 namespace lumeris {
 namespace {
-
-struct FreeReply {
-  void operator()(void* reply) const { std::free(reply); }
-};
-template <typename T>
-using Reply = std::unique_ptr<T, FreeReply>;
 
 // Where a view sits: its top-level window (itself when it is one) and its screen's root.
 struct Placement {
@@ -25,7 +21,7 @@ std::optional<Placement> Locate(xcb_connection_t* connection, xcb_window_t view)
   if (view == XCB_NONE) return std::nullopt;
   xcb_window_t current = view;
   for (;;) {
-    Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection, xcb_query_tree(connection, current), nullptr));
+    XcbReply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection, xcb_query_tree(connection, current), nullptr));
     if (!tree || tree->parent == XCB_NONE) return std::nullopt;
     if (tree->parent == tree->root) return Placement{current, tree->root};
     current = tree->parent;
@@ -37,7 +33,7 @@ std::optional<Placement> Locate(xcb_connection_t* connection, xcb_window_t view)
 Point Translate(xcb_connection_t* connection, xcb_window_t from, xcb_window_t to, Point p) {
   if (from == XCB_NONE || to == XCB_NONE) return {};
   if (from == to) return p;
-  Reply<xcb_translate_coordinates_reply_t> moved(
+  XcbReply<xcb_translate_coordinates_reply_t> moved(
       xcb_translate_coordinates_reply(connection, xcb_translate_coordinates(connection, from, to, 0, 0), nullptr));
   if (!moved || !moved->same_screen) return {};
   return {p.x + moved->dst_x, p.y + moved->dst_y};

@@ -8,14 +8,10 @@
 #include <cstring>
 #include <memory>
 
+#include "viewer/xcb_reply.h"
+
 namespace lumeris {
 namespace {
-
-struct FreeReply {
-  void operator()(void* reply) const { std::free(reply); }
-};
-template <typename T>
-using Reply = std::unique_ptr<T, FreeReply>;
 
 const xcb_visualtype_t* FindVisual(const xcb_setup_t* setup, xcb_visualid_t id) {
   for (auto screens = xcb_setup_roots_iterator(setup); screens.rem; xcb_screen_next(&screens)) {
@@ -83,7 +79,7 @@ PixelBox ToPixels(Rect rect, double scale) {
 cairo_surface_t* CacheWindowContentsImage(xcb_connection_t* connection, xcb_window_t window, Rect rect,
                                           double device_scale) {
   if (connection == nullptr || xcb_connection_has_error(connection) || window == XCB_NONE) return nullptr;
-  Reply<xcb_get_geometry_reply_t> geometry(
+  XcbReply<xcb_get_geometry_reply_t> geometry(
       xcb_get_geometry_reply(connection, xcb_get_geometry(connection, window), nullptr));
   if (!geometry) return nullptr;
 
@@ -97,20 +93,20 @@ cairo_surface_t* CacheWindowContentsImage(xcb_connection_t* connection, xcb_wind
   int bottom = std::min(wanted.y + wanted.height, whole.height);
   if (right <= left || bottom <= top) return nullptr;
   const auto fetch = [&] {
-    return Reply<xcb_get_image_reply_t>(xcb_get_image_reply(
+    return XcbReply<xcb_get_image_reply_t>(xcb_get_image_reply(
         connection,
         xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, window, static_cast<int16_t>(left),
                       static_cast<int16_t>(top), static_cast<uint16_t>(right - left),
                       static_cast<uint16_t>(bottom - top), ~0u),
         nullptr));
   };
-  Reply<xcb_get_image_reply_t> image = fetch();
+  XcbReply<xcb_get_image_reply_t> image = fetch();
   // A window drawn straight on the screen can only be read where it is on the screen: ask again
   // for that part alone (the rest stays white).
   if (!image) {
-    Reply<xcb_translate_coordinates_reply_t> origin(xcb_translate_coordinates_reply(
+    XcbReply<xcb_translate_coordinates_reply_t> origin(xcb_translate_coordinates_reply(
         connection, xcb_translate_coordinates(connection, window, geometry->root, 0, 0), nullptr));
-    Reply<xcb_get_geometry_reply_t> screen(
+    XcbReply<xcb_get_geometry_reply_t> screen(
         xcb_get_geometry_reply(connection, xcb_get_geometry(connection, geometry->root), nullptr));
     if (!origin || !screen) return nullptr;
     left = std::max(left, -origin->dst_x);
