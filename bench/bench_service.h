@@ -7,7 +7,7 @@
 // TimeIterations: times each iteration of a benchmark's body and reports p50_us and p90_us.
 //
 // Include from exactly one source file of a benchmark program that defines
-// LUMERIS_BENCH_FILESERVICE. Not thread-safe: for a benchmark's main thread.
+// LUMERIS_BENCH_FILESERVICE and LUMERIS_BENCH_FONTCONFIG_FILE. Not thread-safe: for a benchmark's main thread.
 #pragma once
 
 #include <benchmark/benchmark.h>
@@ -72,6 +72,9 @@ class BenchService {
     setenv("HOME", (root_ / "home").c_str(), 1);
     setenv("XDG_CONFIG_HOME", (root_ / "config").c_str(), 1);
     setenv("XDG_RUNTIME_DIR", (root_ / "runtime").c_str(), 1);
+    // The source tree's font configuration, so the service names the colour emoji font without
+    // an installed copy.
+    setenv("LUMERIS_FONTCONFIG_FILE", LUMERIS_BENCH_FONTCONFIG_FILE, 0);
     Start();
   }
 
