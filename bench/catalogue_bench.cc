@@ -34,6 +34,8 @@
 #include "categories/localization_lookup.h"
 #include "categories/system_bundles.h"
 #include "client/service_client.h"
+#include "platform/bundle_localization.h"
+#include "platform/preferred_languages.h"
 #include "platform/property_list_io.h"
 #include "platform/system_root.h"
 #include "service/socket_path.h"
@@ -149,25 +151,22 @@ void BM_ReadIcons(benchmark::State& state) {
   std::size_t bytes = 0;
   for (auto _ : state) {
     bytes = 0;
-    // As the catalogue does: the search order once per request, then each lookup per localization.
-    std::vector<std::string> order = app->PreferredLocalizations();
-    std::vector<std::string> framework_order = framework->PreferredLocalizations();
-    const auto find = [](const Bundle& bundle, const std::vector<std::string>& localizations,
-                         const std::string& name, const char* type) -> std::optional<std::filesystem::path> {
-      for (const std::string& localization : localizations) {
-        if (auto path = bundle.PathForResource(name, type, {}, localization)) return path;
-      }
-      return std::nullopt;
-    };
+    // As the catalogue does: each bundle's folders listed once per request, then each lookup.
+    const std::vector<std::string> languages = PreferredLanguages();
+    const Bundle::PlainResourceLookup app_lookup =
+        app->ListPlainResources(PreferredLocalizationsFromArray(app->localizations(), languages));
+    const Bundle::PlainResourceLookup framework_lookup =
+        framework->ListPlainResources(PreferredLocalizationsFromArray(framework->localizations(), languages));
     for (const std::string& name : GetSetup().names) {
-      auto path = find(*app, order, "CategoryImage-" + name, "tiff");
-      if (!path) path = find(*app, order, "CategoryImage-" + name, "pdf");
+      auto path = app_lookup.PathForResource("CategoryImage-" + name, "tiff");
+      if (!path) path = app_lookup.PathForResource("CategoryImage-" + name, "pdf");
       if (path) bytes += ReadBytes(*path).size();
     }
     for (const std::string& image : images) {
-      auto path = find(*framework, framework_order, image, "tiff");
-      if (!path) path = find(*app, order, image, "tiff");
-      if (!path) path = find(*framework, framework_order, image, "pdf");
+      auto path = framework_lookup.PathForResource(image, "tiff");
+      if (!path) path = app_lookup.PathForResource(image, "tiff");
+      if (!path) path = framework_lookup.PathForResource(image, "pdf");
+      if (!path) path = app_lookup.PathForResource(image, "pdf");
       if (path) bytes += ReadBytes(*path).size();
     }
   }

@@ -26,3 +26,10 @@ lumeris_add_gtest(defaults_command_test
   LIBS lumeris_cli_prefs lumeris_preferences lumeris_notifications
   LABELS platform dbus
   PRIVATE_BUS)
+
+lumeris_add_gtest(binary_property_list_reader_test
+  SOURCES platform/binary_property_list_reader_test.cc
+  LIBS lumeris_plist
+  LABELS platform)
+add_dependencies(binary_property_list_reader_test lumeris_resources)
+target_compile_definitions(binary_property_list_reader_test PRIVATE LUMERIS_TEST_BUILD_SYSTEM_ROOT="${LUMERIS_BUILD_SYSTEM_ROOT}")

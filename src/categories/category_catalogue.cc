@@ -1,12 +1,18 @@
 #include "categories/category_catalogue.h"
 
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
 #include <algorithm>
-#include <fstream>
 #include <optional>
 #include <utility>
 
 #include "categories/localization_lookup.h"
 #include "categories/system_bundles.h"
+#include "platform/bundle_localization.h"
+#include "platform/preferred_languages.h"
 #include "platform/property_list_io.h"
 #include "platform/system_root.h"
 
@@ -38,44 +44,44 @@ const std::string* FindString(const plist::Value& dictionary, std::string_view k
 // The whole file as bytes, read straight into the buffer the reply keeps; empty when it cannot
 // be read.
 MessageValue::Bytes ReadFileBytes(const std::filesystem::path& path) {
-  std::ifstream in(path, std::ios::binary | std::ios::ate);
-  const std::streamoff size = in ? static_cast<std::streamoff>(in.tellg()) : -1;
-  if (size <= 0) return {};
-  MessageValue::Bytes bytes(static_cast<std::size_t>(size));
-  in.seekg(0);
-  if (!in.read(reinterpret_cast<char*>(bytes.data()), size)) return {};
+  const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+  if (fd < 0) return {};
+  MessageValue::Bytes bytes;
+  struct stat status {};
+  if (fstat(fd, &status) == 0 && status.st_size > 0) {
+    bytes.resize(static_cast<std::size_t>(status.st_size));
+    std::size_t done = 0;
+    while (done < bytes.size()) {
+      const ssize_t n = ::read(fd, bytes.data() + done, bytes.size() - done);
+      if (n < 0 && errno == EINTR) continue;
+      if (n <= 0) break;
+      done += static_cast<std::size_t>(n);
+    }
+    // A file that shrank meanwhile, or an error: nothing rather than a part.
+    if (done != bytes.size()) bytes.clear();
+  }
+  ::close(fd);
   return bytes;
 }
 
-// The plain resource lookup of one bundle (the non-localized folder, then the user's preferred
-// localizations, then the development localization), with that order worked out once per request:
-// choosing the preferred localizations runs ICU's matcher over every localization of the bundle,
-// which would otherwise happen again for every icon that is not found in the first place tried.
+// A bundle's plain resource lookup for one request, or none for a missing bundle. The folders are
+// listed once: most icons are not found in the first place tried, and each miss would otherwise
+// cost a stat per folder.
 class PlainLookup {
  public:
-  explicit PlainLookup(const Bundle* bundle) : bundle_(bundle) {
-    if (bundle_ == nullptr) return;
-    order_ = bundle_->PreferredLocalizations();
-    const auto& development = bundle_->development_localization();
-    if (development && std::find(order_.begin(), order_.end(), *development) == order_.end()) {
-      order_.push_back(*development);
+  // `languages`: the user's preferred languages.
+  PlainLookup(const Bundle* bundle, const std::vector<std::string>& languages) {
+    if (bundle != nullptr) {
+      lookup_ = bundle->ListPlainResources(PreferredLocalizationsFromArray(bundle->localizations(), languages));
     }
   }
 
   std::optional<std::filesystem::path> PathForResource(std::string_view name, std::string_view type) const {
-    if (bundle_ == nullptr) return std::nullopt;
-    // Without any localization to try, only the non-localized folder is searched.
-    if (order_.empty()) return bundle_->PathForResource(name, type);
-    // Each call looks in the non-localized folder first, then in the one localization.
-    for (const std::string& localization : order_) {
-      if (auto path = bundle_->PathForResource(name, type, {}, localization)) return path;
-    }
-    return std::nullopt;
+    return lookup_ ? lookup_->PathForResource(name, type) : std::nullopt;
   }
 
  private:
-  const Bundle* bundle_;
-  std::vector<std::string> order_;
+  std::optional<Bundle::PlainResourceLookup> lookup_;
 };
 
 // The first file found for `name` trying, for "tiff" and then "pdf", each bundle in order;
@@ -191,13 +197,15 @@ void SetOrdinaryCategoryData(const Bundle* application, const std::string& name,
 MessageValue CreateCategoryDataArrayFromBundles(const StringList& names, const Bundle* application,
                                                 const Bundle* framework) {
   MessageValue result = MessageValue::MakeArray();
-  const std::string localization = PreferredLocalizationOfBundle(application);
+  // The user's languages, read once per request.
+  const std::vector<std::string> languages = PreferredLanguages();
+  const std::string localization = PreferredLocalizationOfBundle(application, languages);
   // Read at every request, and deliberately not applied: the entries follow the request alone,
   // neither filtered nor reordered by what the plist offers.
   [[maybe_unused]] const std::optional<plist::Value> offered = SymbolsGroupCategories(application, localization);
   if (!names) return result;
-  const PlainLookup application_lookup(application);
-  const PlainLookup framework_lookup(framework);
+  const PlainLookup application_lookup(application, languages);
+  const PlainLookup framework_lookup(framework, languages);
   for (const std::string& name : *names) {
     MessageValue entry = MessageValue::MakeDictionary();
     if (name == kEmojiCategoryName) {

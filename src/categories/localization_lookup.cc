@@ -26,8 +26,12 @@ std::optional<std::string> Copy(std::optional<std::string_view> value) {
 }  // namespace
 
 std::string PreferredLocalizationOfBundle(const Bundle* bundle) {
+  return PreferredLocalizationOfBundle(bundle, PreferredLanguages());
+}
+
+std::string PreferredLocalizationOfBundle(const Bundle* bundle, const std::vector<std::string>& languages) {
   if (bundle != nullptr) {
-    std::vector<std::string> matches = PreferredLocalizationsFromArray(bundle->localizations(), PreferredLanguages());
+    std::vector<std::string> matches = PreferredLocalizationsFromArray(bundle->localizations(), languages);
     if (!matches.empty()) return std::move(matches.front());
   }
   return std::string(kFallbackLocalization);

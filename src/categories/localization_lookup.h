@@ -44,6 +44,8 @@ inline constexpr std::string_view kDefaultStringsTable = "Localizable";
 // The bundle's localization that best matches the user's preferred languages, else "English"
 // (also for a null bundle). Never empty.
 std::string PreferredLocalizationOfBundle(const Bundle* bundle);
+// The same for `languages` read by the caller (PreferredLanguages()).
+std::string PreferredLocalizationOfBundle(const Bundle* bundle, const std::vector<std::string>& languages);
 
 class StringsTableCache {
  public:

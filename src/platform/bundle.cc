@@ -1,5 +1,7 @@
 #include "platform/bundle.h"
 
+#include <dirent.h>
+
 #include <algorithm>
 #include <system_error>
 #include <utility>
@@ -92,12 +94,54 @@ std::vector<std::string> Bundle::PreferredLocalizations() const {
 
 std::optional<std::filesystem::path> Bundle::LocalizationDirectory(std::string_view localization) const {
   if (!IsPlainComponent(localization)) return std::nullopt;
-  std::vector<std::string_view> names = {localization};
-  if (const auto code = LanguageCodeForOldStyleLocalization(localization)) names.push_back(*code);
-  if (const auto old_style = OldStyleLocalizationForLanguageCode(localization)) names.push_back(*old_style);
-  for (const std::string_view name : names) {
+  const auto directory_of = [&](std::string_view name) -> std::optional<fs::path> {
     fs::path directory = resources_ / (std::string(name) + std::string(kLocalizationSuffix));
     if (IsDirectory(directory)) return directory;
+    return std::nullopt;
+  };
+  // The aliases are worked out only when the name itself has no folder (they ask ICU).
+  if (auto directory = directory_of(localization)) return directory;
+  if (const auto code = LanguageCodeForOldStyleLocalization(localization)) {
+    if (auto directory = directory_of(*code)) return directory;
+  }
+  if (const auto old_style = OldStyleLocalizationForLanguageCode(localization)) return directory_of(*old_style);
+  return std::nullopt;
+}
+
+Bundle::PlainResourceLookup Bundle::ListPlainResources(const std::vector<std::string>& matches) const {
+  PlainResourceLookup lookup;
+  const auto add_folder = [&](fs::path path) {
+    PlainResourceLookup::Folder& folder = lookup.folders_.emplace_back();
+    // readdir() itself: directory_iterator makes a path object per entry, which costs more
+    // here than the listing.
+    if (DIR* directory = opendir(path.c_str())) {
+      while (const dirent* entry = readdir(directory)) folder.files.emplace(entry->d_name);
+      closedir(directory);
+    }
+    folder.path = std::move(path);
+  };
+  add_folder(resources_);
+  // The order PathForResource() tries without a localization (PreferredLocalizations(), which
+  // falls back to the development localization, then that one).
+  std::vector<std::string> order = matches;
+  if (development_localization_) AppendUnique(order, *development_localization_);
+  for (const std::string& each : order) {
+    if (auto directory = LocalizationDirectory(each)) add_folder(std::move(*directory));
+  }
+  return lookup;
+}
+
+std::optional<std::filesystem::path> Bundle::PlainResourceLookup::PathForResource(std::string_view name,
+                                                                                 std::string_view type) const {
+  if (!IsPlainComponent(name) || (!type.empty() && !IsPlainComponent(type))) return std::nullopt;
+  std::string file(name);
+  if (!type.empty()) file.append(".").append(type);
+  for (const Folder& folder : folders_) {
+    // A listed name can still be a dangling link: the same existence test as PathForResource().
+    if (folder.files.contains(file)) {
+      fs::path candidate = folder.path / file;
+      if (Exists(candidate)) return candidate;
+    }
   }
   return std::nullopt;
 }

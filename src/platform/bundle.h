@@ -27,6 +27,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 #include "platform/property_list.h"
@@ -60,6 +61,25 @@ class Bundle {
   std::optional<std::filesystem::path> PathForResource(
       std::string_view name, std::string_view type, std::string_view subdirectory = {},
       std::optional<std::string_view> localization = std::nullopt) const;
+
+  // The plain lookup (PathForResource() without a localization or sub-directory) for a run of
+  // resources, with the folders listed once: each later lookup costs a set search instead of a
+  // failed stat per folder tried. `matches` are the bundle's localizations that match the user's
+  // languages, best first (PreferredLocalizationsFromArray of localizations()), worked out once
+  // by the caller. Reflects the folders as they were listed; use it for one request only.
+  class PlainResourceLookup {
+   public:
+    std::optional<std::filesystem::path> PathForResource(std::string_view name, std::string_view type) const;
+
+   private:
+    friend class Bundle;
+    struct Folder {
+      std::filesystem::path path;
+      std::unordered_set<std::string> files;
+    };
+    std::vector<Folder> folders_;  // the non-localized folder, then one per localization
+  };
+  PlainResourceLookup ListPlainResources(const std::vector<std::string>& matches) const;
 
   // The bundle's own localized string: `key` in strings table `table` ("Localizable" when absent
   // or empty) found by PathForResource() without a localization, i.e. following the user's

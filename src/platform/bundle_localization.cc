@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <array>
+#include <mutex>
 #include <utility>
 
 namespace lumeris {
@@ -27,24 +28,8 @@ std::optional<icu::Locale> ParseLanguageTag(std::string_view tag) {
   return locale;
 }
 
-}  // namespace
-
-std::optional<std::string_view> LanguageCodeForOldStyleLocalization(std::string_view localization) {
-  for (const auto& [name, code] : kOldStyleNames) {
-    if (name == localization) return code;
-  }
-  return std::nullopt;
-}
-
-std::optional<std::string_view> OldStyleLocalizationForLanguageCode(std::string_view code) {
-  for (const auto& [name, language] : kOldStyleNames) {
-    if (language == code) return name;
-  }
-  return std::nullopt;
-}
-
-std::vector<std::string> PreferredLocalizationsFromArray(std::span<const std::string> localizations,
-                                                         std::span<const std::string> preferences) {
+std::vector<std::string> Match(std::span<const std::string> localizations,
+                               std::span<const std::string> preferences) {
   std::vector<icu::Locale> supported;
   std::vector<std::size_t> localization_of_supported;
   for (std::size_t i = 0; i < localizations.size(); ++i) {
@@ -76,6 +61,69 @@ std::vector<std::string> PreferredLocalizationsFromArray(std::span<const std::st
     }
   }
   return matches;
+}
+
+// The last few answers of Match(). Matching is a pure function of the two lists (and ICU's data),
+// and building the matcher parses every localization name: about 60 us for a bundle of 120
+// localizations, asked several times per catalogue request with the same lists.
+class RecentMatches {
+ public:
+  std::vector<std::string> Get(std::span<const std::string> localizations,
+                               std::span<const std::string> preferences) {
+    const auto same = [&](const Entry& entry) {
+      return std::equal(entry.localizations.begin(), entry.localizations.end(), localizations.begin(),
+                        localizations.end()) &&
+             std::equal(entry.preferences.begin(), entry.preferences.end(), preferences.begin(),
+                        preferences.end());
+    };
+    {
+      std::lock_guard lock(mutex_);
+      for (const Entry& entry : entries_) {
+        if (same(entry)) return entry.matches;
+      }
+    }
+    Entry entry{{localizations.begin(), localizations.end()},
+                {preferences.begin(), preferences.end()},
+                Match(localizations, preferences)};
+    std::vector<std::string> matches = entry.matches;
+    std::lock_guard lock(mutex_);
+    if (entries_.size() == kEntries) entries_.erase(entries_.begin());
+    entries_.push_back(std::move(entry));
+    return matches;
+  }
+
+ private:
+  static constexpr std::size_t kEntries = 4;
+  struct Entry {
+    std::vector<std::string> localizations;
+    std::vector<std::string> preferences;
+    std::vector<std::string> matches;
+  };
+  std::mutex mutex_;
+  std::vector<Entry> entries_;
+};
+
+}  // namespace
+
+std::vector<std::string> PreferredLocalizationsFromArray(std::span<const std::string> localizations,
+                                                         std::span<const std::string> preferences) {
+  // Never destroyed, so that lookups during exit stay safe.
+  static RecentMatches* const recent = new RecentMatches();
+  return recent->Get(localizations, preferences);
+}
+
+std::optional<std::string_view> LanguageCodeForOldStyleLocalization(std::string_view localization) {
+  for (const auto& [name, code] : kOldStyleNames) {
+    if (name == localization) return code;
+  }
+  return std::nullopt;
+}
+
+std::optional<std::string_view> OldStyleLocalizationForLanguageCode(std::string_view code) {
+  for (const auto& [name, language] : kOldStyleNames) {
+    if (language == code) return name;
+  }
+  return std::nullopt;
 }
 
 }  // namespace lumeris

@@ -16,6 +16,8 @@
 #include <memory>
 #include <utility>
 
+#include "platform/binary_property_list_reader.h"
+
 namespace lumeris::plist {
 namespace {
 
@@ -369,6 +371,14 @@ bool IsPropertyListText(std::string_view text) {
 }
 
 std::optional<Value> ParsePropertyList(std::span<const std::uint8_t> bytes) {
+  if (bytes.empty() || bytes.size() > std::numeric_limits<std::uint32_t>::max()) return std::nullopt;
+  // The common binary documents are read directly (several times faster: no node tree to
+  // build, convert and free); libplist reads everything else.
+  if (std::optional<Value> value = ReadCommonBinaryPropertyList(bytes)) return value;
+  return ParsePropertyListWithLibplist(bytes);
+}
+
+std::optional<Value> ParsePropertyListWithLibplist(std::span<const std::uint8_t> bytes) {
   if (bytes.empty() || bytes.size() > std::numeric_limits<std::uint32_t>::max()) return std::nullopt;
   plist_t root = nullptr;
   plist_from_memory(reinterpret_cast<const char*>(bytes.data()), static_cast<std::uint32_t>(bytes.size()), &root);

@@ -42,6 +42,9 @@ bool IsPropertyListText(std::string_view text);
 
 // Parses a binary or XML property list (the format is told by the first bytes).
 std::optional<Value> ParsePropertyList(std::span<const std::uint8_t> bytes);
+// The same through libplist alone, without the direct reader of common binary documents
+// (binary_property_list_reader.h) that ParsePropertyList tries first; for comparing the two.
+std::optional<Value> ParsePropertyListWithLibplist(std::span<const std::uint8_t> bytes);
 
 // Reads and parses a file; std::nullopt when it is missing, unreadable or does not parse.
 std::optional<Value> ReadPropertyListFile(const std::filesystem::path& path);
