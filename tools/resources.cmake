@@ -66,8 +66,14 @@ set(LUMERIS_RESOURCE_INPUTS
   ${LUMERIS_CLDR_MAIN_FILES}
   ${PROJECT_SOURCE_DIR}/LICENSES/Unicode-DFS-2016.txt)
 
-# Reruns only when the builder or an input changes. Leak checking is off for the run: the
-# font libraries keep process-lifetime caches that a sanitizer build would report.
+# Stores the search index in the character database the builder wrote (the service reads it
+# at start instead of scanning the whole table).
+add_executable(lumeris-search-index-writer search_index/main.cc)
+target_link_libraries(lumeris-search-index-writer PRIVATE lumeris_database)
+
+# Reruns only when the builder or an input changes; the stamp is written last, so a failed step
+# runs again. Leak checking is off for the run: the font libraries keep process-lifetime caches
+# that a sanitizer build would report.
 set(LUMERIS_RESOURCES_STAMP ${LUMERIS_BUILD_SYSTEM_ROOT}/.resources.stamp)
 add_custom_command(
   OUTPUT ${LUMERIS_RESOURCES_STAMP}
@@ -78,8 +84,12 @@ add_custom_command(
           --license ${PROJECT_SOURCE_DIR}/LICENSES/Unicode-DFS-2016.txt
           --unicode-dir ${LUMERIS_UNICODE_DIR}
           --cldr-dir ${LUMERIS_CLDR_DIR}
-          --stamp ${LUMERIS_RESOURCES_STAMP}
-  DEPENDS lumeris-resource-builder ${LUMERIS_RESOURCE_INPUTS}
+          --stamp ${LUMERIS_RESOURCES_STAMP}.partial
+  COMMAND ${CMAKE_COMMAND} -E env ASAN_OPTIONS=detect_leaks=0
+          $<TARGET_FILE:lumeris-search-index-writer>
+          "${LUMERIS_BUILD_SYSTEM_ROOT}/System/Library/Input Methods/Sorvendi.app/Contents/Resources/CharacterDB.sqlite3"
+  COMMAND ${CMAKE_COMMAND} -E rename ${LUMERIS_RESOURCES_STAMP}.partial ${LUMERIS_RESOURCES_STAMP}
+  DEPENDS lumeris-resource-builder lumeris-search-index-writer ${LUMERIS_RESOURCE_INPUTS}
   COMMENT "Building the resource bundles under ${LUMERIS_BUILD_SYSTEM_ROOT}"
   VERBATIM)
 add_custom_target(lumeris_resources ALL DEPENDS ${LUMERIS_RESOURCES_STAMP})

@@ -14,6 +14,7 @@
 #include "categories/system_bundles.h"
 #include "database/character_info_fields.h"
 #include "database/search_filters.h"
+#include "database/search_index_table.h"
 #include "platform/property_list_io.h"
 #include "text/replacement_dictionary.h"
 #include "text/scalar.h"
@@ -140,7 +141,6 @@ void LMCharacterDatabase::PrepareSearchIndex() {
   if (rules_ != Rules::kIndexed) return;
   Connection* connection = Open(_charDatabase, "CharacterDB");
   if (connection == nullptr) return;
-  preparing_.store(true);
   SearchIndex(*connection);
 }
 
@@ -152,7 +152,13 @@ const CharacterSearchIndex* LMCharacterDatabase::SearchIndex(Connection& connect
     sqlite3* db = nullptr;
     if (path != nullptr && *path != '\0' &&
         sqlite3_open_v2(path, &db, SQLITE_OPEN_READONLY, nullptr) == SQLITE_OK) {
-      search_index_ = CharacterSearchIndex::Build(db, fonts_);
+      // The copy the resource builder stored (read in a few milliseconds: searches wait for
+      // it), else the table itself (searches meanwhile go to the reference).
+      search_index_ = ReadSearchIndexTable(db, fonts_);
+      if (!search_index_) {
+        reading_table_.store(true);
+        search_index_ = CharacterSearchIndex::Build(db, fonts_);
+      }
     }
     sqlite3_close(db);
     if (search_index_) {
@@ -206,9 +212,9 @@ MessageValue LMCharacterDatabase::createXPCArrayForSearchString(const icu::Unico
   // rest.
   if (rules_ == Rules::kIndexed && utf8->find('\0') == std::string::npos &&
       utf8->find('|') == std::string::npos && utf8->size() <= kIndexedSearchMaxBytes) {
-    // While PrepareSearchIndex() reads the table on its thread, the reference answers (reading
-    // the table takes several times as long as one reference search).
-    const bool wait = search_index_ready_.load(std::memory_order_acquire) || !preparing_.load();
+    // While the index is built from the table, the reference answers (reading the table takes
+    // several times as long as one reference search).
+    const bool wait = search_index_ready_.load(std::memory_order_acquire) || !reading_table_.load();
     if (wait && SearchIndex(*connection) != nullptr)
       return IndexedSearch(*connection, *utf8, text, maxCount);
   }

@@ -79,8 +79,9 @@ class LMCharacterDatabase {
   ~LMCharacterDatabase();
 
   // Opens CharacterDB and reads the search index now, if the rules use one; the rest of the index
-  // is completed on a thread of this object. Searches made while it reads are answered by the
-  // reference rules instead of waiting; without this call the first search reads the index.
+  // is completed on a thread of this object. Searches made meanwhile wait for the index stored in
+  // the database; when there is none and the index is built from the table, they are answered by
+  // the reference rules instead. Without this call the first search reads the index.
   void PrepareSearchIndex();
 
   // Characters whose field 0 ("unam") contains `text`, ignoring case: emoji-font characters
@@ -146,7 +147,7 @@ class LMCharacterDatabase {
   std::once_flag search_index_once_;
   std::unique_ptr<CharacterSearchIndex> search_index_;  // set once, under search_index_once_
   std::atomic<bool> search_index_ready_{false};         // search_index_once_ has run
-  std::atomic<bool> preparing_{false};                  // PrepareSearchIndex() was called
+  std::atomic<bool> reading_table_{false};  // the index is being built from unihan_dict itself
   std::once_flag related_index_once_;
   std::unique_ptr<RelatedCharacterIndex> related_index_;  // set once, under related_index_once_
   std::atomic<bool> stopping_{false};

@@ -3,6 +3,7 @@
 #include <malloc.h>
 #include <unicode/utf8.h>
 
+#include <unordered_map>
 #include <utility>
 
 #include "database/search_filters.h"
@@ -156,28 +157,27 @@ bool CharacterSearchIndex::NoEmojiRowAfter(uint32_t row) const {
          static_cast<int64_t>(row) >= last_emoji_row_;
 }
 
-const std::string* CharacterSearchIndex::RarestPostings(std::string_view needle, bool* none) const {
-  const std::string* rarest = nullptr;
+std::string_view CharacterSearchIndex::RarestPostings(std::string_view needle) const {
+  std::string_view rarest;
   for (std::size_t i = 0; i + 3 <= needle.size(); ++i) {
-    auto it = postings_.find(Trigram(needle.data() + i));
-    if (it == postings_.end()) {
-      *none = true;
-      return nullptr;
-    }
-    if (rarest == nullptr || it->second.size() < rarest->size()) rarest = &it->second;
+    const auto it = std::lower_bound(trigrams_.begin(), trigrams_.end(), Trigram(needle.data() + i));
+    if (it == trigrams_.end() || *it != Trigram(needle.data() + i)) return {};
+    const auto k = static_cast<std::size_t>(it - trigrams_.begin());
+    const std::string_view list =
+        std::string_view(postings_).substr(posting_start_[k], posting_start_[k + 1] - posting_start_[k]);
+    if (rarest.empty() || list.size() < rarest.size()) rarest = list;
   }
   return rarest;
 }
 
-void CharacterSearchIndex::CompleteInBackground(const std::atomic<bool>& stop) {
-  // Trigrams first: they serve the searches of whole words, the most frequent.
+bool CharacterSearchIndex::BuildTrigrams(const std::atomic<bool>& stop) {
   const uint32_t rows = size();
   // Each row's distinct trigrams, appended to their lists in row order, as deltas from the
   // list's previous row.
   std::unordered_map<uint32_t, std::pair<std::string, uint32_t>> lists;
   std::vector<uint32_t> trigrams;
   for (uint32_t row = 0; row < rows; ++row) {
-    if ((row & 1023) == 0 && stop.load(std::memory_order_relaxed)) return;
+    if ((row & 1023) == 0 && stop.load(std::memory_order_relaxed)) return false;
     const std::string_view text = folded(row);
     trigrams.clear();
     for (std::size_t i = 0; i + 3 <= text.size(); ++i) trigrams.push_back(Trigram(text.data() + i));
@@ -189,24 +189,163 @@ void CharacterSearchIndex::CompleteInBackground(const std::atomic<bool>& stop) {
       previous = row;
     }
   }
-  postings_.reserve(lists.size());
-  for (auto& [trigram, list] : lists) {
-    list.first.shrink_to_fit();
-    postings_.emplace(trigram, std::move(list.first));
+  trigrams_.reserve(lists.size());
+  for (const auto& entry : lists) trigrams_.push_back(entry.first);
+  std::sort(trigrams_.begin(), trigrams_.end());
+  posting_start_.reserve(trigrams_.size() + 1);
+  for (uint32_t trigram : trigrams_) {
+    posting_start_.push_back(static_cast<uint32_t>(postings_.size()));
+    postings_ += lists[trigram].first;
   }
+  posting_start_.push_back(static_cast<uint32_t>(postings_.size()));
   lists = {};
   // The lists grew by reallocation; give the freed pages back.
   malloc_trim(0);
   trigrams_complete_.store(true, std::memory_order_release);
+  return true;
+}
 
+void CharacterSearchIndex::CompleteInBackground(const std::atomic<bool>& stop) {
+  // Trigrams first: they serve the searches of whole words, the most frequent.
+  if (!trigrams_complete_.load(std::memory_order_acquire) && !BuildTrigrams(stop)) return;
   std::vector<uint32_t> emoji_rows;
-  for (uint32_t row = 0; row < rows; ++row) {
+  for (uint32_t row = 0; row < size(); ++row) {
     if (stop.load(std::memory_order_relaxed)) return;
     if (EmojiFontDraws(row)) emoji_rows.push_back(row);
   }
   emoji_rows_ = std::move(emoji_rows);
   last_emoji_row_ = emoji_rows_.empty() ? -1 : emoji_rows_.back();
   emoji_complete_.store(true, std::memory_order_release);
+}
+
+namespace {
+
+// "LMSI", the format number and a byte-order mark, so that an index of another version or of a
+// machine of the other byte order is rebuilt instead of misread.
+constexpr std::string_view kMagic = "LMSI";
+constexpr uint32_t kFormat = 1;
+constexpr uint32_t kByteOrderMark = 0x01020304;
+
+class Writer {
+ public:
+  template <typename T>
+  void Pod(const T& value) {
+    out_.append(reinterpret_cast<const char*>(&value), sizeof value);
+  }
+  template <typename T>
+  void Vector(const std::vector<T>& values) {
+    Pod(static_cast<uint64_t>(values.size()));
+    out_.append(reinterpret_cast<const char*>(values.data()), values.size() * sizeof(T));
+  }
+  void Bytes(std::string_view bytes) {
+    Pod(static_cast<uint64_t>(bytes.size()));
+    out_.append(bytes);
+  }
+  std::string Take() { return std::move(out_); }
+
+ private:
+  std::string out_;
+};
+
+class Reader {
+ public:
+  explicit Reader(std::string_view in) : in_(in) {}
+  template <typename T>
+  bool Pod(T* value) {
+    if (in_.size() < sizeof *value) return false;
+    memcpy(value, in_.data(), sizeof *value);
+    in_.remove_prefix(sizeof *value);
+    return true;
+  }
+  template <typename T>
+  bool Vector(std::vector<T>* values) {
+    uint64_t count = 0;
+    if (!Pod(&count) || count > in_.size() / sizeof(T)) return false;
+    values->resize(count);
+    memcpy(values->data(), in_.data(), count * sizeof(T));
+    in_.remove_prefix(count * sizeof(T));
+    return true;
+  }
+  bool Bytes(std::string* bytes) {
+    uint64_t count = 0;
+    if (!Pod(&count) || count > in_.size()) return false;
+    bytes->assign(in_.substr(0, count));
+    in_.remove_prefix(count);
+    return true;
+  }
+  bool AtEnd() const { return in_.empty(); }
+
+ private:
+  std::string_view in_;
+};
+
+// Offsets that start at 0, never go down and end at `end`, one more than `count`.
+bool AreOffsets(const std::vector<uint32_t>& offsets, std::size_t count, std::size_t end) {
+  return offsets.size() == count + 1 && offsets.front() == 0 && offsets.back() == end &&
+         std::is_sorted(offsets.begin(), offsets.end());
+}
+
+}  // namespace
+
+std::string CharacterSearchIndex::Serialize() const {
+  Writer out;
+  out.Bytes(kMagic);
+  out.Pod(kFormat);
+  out.Pod(kByteOrderMark);
+  out.Bytes(folded_);
+  out.Vector(folded_start_);
+  out.Bytes(uchr_);
+  out.Vector(uchr_start_);
+  out.Vector(rowid_);
+  out.Vector(ascii_);
+  out.Vector(trigrams_);
+  out.Vector(posting_start_);
+  out.Bytes(postings_);
+  return out.Take();
+}
+
+std::unique_ptr<CharacterSearchIndex> CharacterSearchIndex::Deserialize(std::string_view bytes,
+                                                                        const FontQueries& fonts) {
+  std::unique_ptr<CharacterSearchIndex> index(new CharacterSearchIndex(fonts));
+  Reader in(bytes);
+  std::string magic;
+  uint32_t format = 0;
+  uint32_t byte_order = 0;
+  if (!in.Bytes(&magic) || magic != kMagic || !in.Pod(&format) || format != kFormat ||
+      !in.Pod(&byte_order) || byte_order != kByteOrderMark || !in.Bytes(&index->folded_) ||
+      !in.Vector(&index->folded_start_) || !in.Bytes(&index->uchr_) || !in.Vector(&index->uchr_start_) ||
+      !in.Vector(&index->rowid_) || !in.Vector(&index->ascii_) || !in.Vector(&index->trigrams_) ||
+      !in.Vector(&index->posting_start_) || !in.Bytes(&index->postings_) || !in.AtEnd() ||
+      !index->IsConsistent()) {
+    return nullptr;
+  }
+  const std::size_t rows = index->rowid_.size();
+  index->emoji_ = std::make_unique<std::atomic<uint8_t>[]>(rows);
+  index->default_like_ = std::make_unique<std::atomic<uint8_t>[]>(rows);
+  index->trigrams_complete_.store(true, std::memory_order_release);
+  return index;
+}
+
+bool CharacterSearchIndex::IsConsistent() const {
+  const std::size_t rows = rowid_.size();
+  if (ascii_.size() != rows || !AreOffsets(folded_start_, rows, folded_.size()) ||
+      !AreOffsets(uchr_start_, rows, uchr_.size()) ||
+      !std::is_sorted(trigrams_.begin(), trigrams_.end()) ||
+      !AreOffsets(posting_start_, trigrams_.size(), postings_.size())) {
+    return false;
+  }
+  // Every folded text ends with its NUL; every posting list ends a number, so reading one never
+  // runs into the next (ForEachMatch() also stops at a row beyond the last).
+  for (std::size_t row = 0; row < rows; ++row) {
+    if (folded_start_[row + 1] == folded_start_[row] || folded_[folded_start_[row + 1] - 1] != '\0') return false;
+  }
+  for (std::size_t k = 0; k < trigrams_.size(); ++k) {
+    if (posting_start_[k + 1] == posting_start_[k] ||
+        static_cast<uint8_t>(postings_[posting_start_[k + 1] - 1]) >= 0x80) {
+      return false;
+    }
+  }
+  return true;
 }
 
 }  // namespace lumeris

@@ -20,10 +20,14 @@
 // which texts of three bytes or more visit only the rows of their rarest trigram, then asks the
 // emoji question for every row, after which the position of the last emoji row is known.
 //
-// Thread-safety: after Build() every const member may be called from any thread at the same time;
-// CompleteInBackground() runs on one thread beside them (what it adds is published with release
-// stores). The font answers are cached per row with atomics; the font queries must give the same
-// answer for the same string for the life of the index.
+// The resource builder stores the index with its trigrams in the database (search_index_table.h),
+// so that a service reads it at start instead of scanning and folding the whole table:
+// Serialize() writes everything but the font answers, Deserialize() checks and reads it back.
+//
+// Thread-safety: after Build() or Deserialize() every const member may be called from any thread
+// at the same time; CompleteInBackground() runs on one thread beside them (what it adds is
+// published with release stores). The font answers are cached per row with atomics; the font
+// queries must give the same answer for the same string for the life of the index.
 #pragma once
 
 #include <sqlite3.h>
@@ -36,7 +40,6 @@
 #include <memory>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <vector>
 
 #include "database/font_queries.h"
@@ -66,9 +69,17 @@ class CharacterSearchIndex {
   // True when the emoji answers of all rows are known and no row after `row` is an emoji row.
   bool NoEmojiRowAfter(uint32_t row) const;
 
-  // Builds the trigram index, then asks the emoji question for every row; returns early when
-  // `stop` becomes true. Call at most once.
+  // Builds the trigram index unless it was read with the index, then asks the emoji question for
+  // every row; returns early when `stop` becomes true. Call at most once.
   void CompleteInBackground(const std::atomic<bool>& stop);
+
+  // The trigram index alone (for the builder, before Serialize()); false when `stop` became true.
+  bool BuildTrigrams(const std::atomic<bool>& stop);
+
+  // The rows and trigrams as bytes of this machine's byte order; Deserialize() takes them back,
+  // and gives nullptr for bytes that are not a whole, consistent index.
+  std::string Serialize() const;
+  static std::unique_ptr<CharacterSearchIndex> Deserialize(std::string_view bytes, const FontQueries& fonts);
 
   uint32_t size() const { return static_cast<uint32_t>(rowid_.size()); }
 
@@ -79,9 +90,11 @@ class CharacterSearchIndex {
                                             folded_start_[row + 1] - folded_start_[row] - 1);
   }
   bool Contains(uint32_t row, std::string_view needle) const;
-  // The posting list of the rarest trigram of `needle` (at least three bytes), or nullptr when
-  // some trigram of it is in no row.
-  const std::string* RarestPostings(std::string_view needle, bool* none) const;
+  // The posting list of the rarest trigram of `needle` (at least three bytes); empty when some
+  // trigram of it is in no row.
+  std::string_view RarestPostings(std::string_view needle) const;
+  // Whether the offsets and posting lists stay inside the buffers (checked on Deserialize()).
+  bool IsConsistent() const;
 
   const FontQueries fonts_;
   std::string folded_;                  // folded field 0 of every row, each followed by NUL
@@ -98,7 +111,10 @@ class CharacterSearchIndex {
   std::vector<uint32_t> emoji_rows_;
   int64_t last_emoji_row_ = -1;
   std::atomic<bool> emoji_complete_{false};
-  std::unordered_map<uint32_t, std::string> postings_;  // trigram -> varint row deltas
+  // Per trigram in ascending order, its rows as varint deltas: postings_ from posting_start_[i].
+  std::vector<uint32_t> trigrams_;
+  std::vector<uint32_t> posting_start_;  // trigrams_.size() + 1 offsets into postings_
+  std::string postings_;
   std::atomic<bool> trigrams_complete_{false};
 };
 
@@ -112,18 +128,18 @@ void CharacterSearchIndex::ForEachMatch(std::string_view needle, bool emoji_only
     return;
   }
   if (needle.size() >= 3 && trigrams_complete_.load(std::memory_order_acquire)) {
-    bool none = false;
-    const std::string* postings = RarestPostings(needle, &none);
-    if (none) return;
+    const std::string_view postings = RarestPostings(needle);
     uint32_t row = 0;
-    for (std::size_t i = 0; i < postings->size();) {
+    for (std::size_t i = 0; i < postings.size();) {
       uint32_t delta = 0;
-      for (int shift = 0;; shift += 7) {
-        const auto byte = static_cast<uint8_t>((*postings)[i++]);
+      for (int shift = 0; shift < 32; shift += 7) {
+        const auto byte = static_cast<uint8_t>(postings[i++]);
         delta |= static_cast<uint32_t>(byte & 0x7f) << shift;
         if ((byte & 0x80) == 0) break;
       }
       row += delta;
+      // Only a damaged stored index has rows beyond the last.
+      if (row >= size()) return;
       if (Contains(row, needle) && !visit(row)) return;
     }
     return;
