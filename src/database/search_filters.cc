@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <string>
 #include <string_view>
 
 #include "categories/regional_restriction.h"
@@ -47,29 +48,41 @@ CaseInsensitiveText::CaseInsensitiveText(const icu::UnicodeString& text) : origi
   const int32_t length = original_.length();
   const char16_t* units = original_.getBuffer();
   folded_index_.assign(static_cast<std::size_t>(length) + 1, 0);
+  folded_start_.reserve(static_cast<std::size_t>(length));
+  folded_end_.reserve(static_cast<std::size_t>(length));
+  std::u16string folded;
+  folded.reserve(static_cast<std::size_t>(length));
   for (int32_t i = 0; i < length;) {
     const int32_t start = i;
     U16_FWD_1(units, i, length);
-    // Full case folding of one code point: at most three code points (six units) come out.
+    // Full case folding of one code point: at most three code points (six units) come out. An
+    // ASCII letter folds to its lower case and any other ASCII character to itself, which
+    // spares ICU the most frequent case.
     char16_t buffer[U16_MAX_LENGTH * 3 + 2];
-    UErrorCode status = U_ZERO_ERROR;
-    int32_t n = u_strFoldCase(buffer, static_cast<int32_t>(std::size(buffer)), units + start,
-                              i - start, U_FOLD_CASE_DEFAULT, &status);
-    if (U_FAILURE(status)) {
-      n = i - start;
-      std::copy(units + start, units + i, buffer);
+    int32_t n = 1;
+    if (units[start] < 0x80) {
+      buffer[0] = units[start] >= u'A' && units[start] <= u'Z' ? units[start] + (u'a' - u'A') : units[start];
+    } else {
+      UErrorCode status = U_ZERO_ERROR;
+      n = u_strFoldCase(buffer, static_cast<int32_t>(std::size(buffer)), units + start, i - start,
+                        U_FOLD_CASE_DEFAULT, &status);
+      if (U_FAILURE(status)) {
+        n = i - start;
+        std::copy(units + start, units + i, buffer);
+      }
     }
-    folded_index_[static_cast<std::size_t>(start)] = folded_.length();
-    folded_.append(buffer, 0, n);
+    folded_index_[static_cast<std::size_t>(start)] = static_cast<int32_t>(folded.size());
+    folded.append(buffer, static_cast<std::size_t>(n));
     for (int32_t k = 0; k < n; ++k) {
       folded_start_.push_back(start);
       folded_end_.push_back(i);
     }
     for (int32_t inner = start + 1; inner < i; ++inner) {
-      folded_index_[static_cast<std::size_t>(inner)] = folded_.length();
+      folded_index_[static_cast<std::size_t>(inner)] = static_cast<int32_t>(folded.size());
     }
   }
-  folded_index_[static_cast<std::size_t>(length)] = folded_.length();
+  folded_index_[static_cast<std::size_t>(length)] = static_cast<int32_t>(folded.size());
+  folded_ = icu::UnicodeString(folded.data(), static_cast<int32_t>(folded.size()));
 }
 
 std::optional<CaseInsensitiveText::Match> CaseInsensitiveText::Find(
