@@ -23,3 +23,8 @@ if(NOT LUMERIS_SANITIZE)
     LIBS lumeris_database lumeris_categories lumeris_font_coverage lumeris_preferences lumeris SQLite::SQLite3
     LABELS database)
 endif()
+
+lumeris_add_gtest(lumeris_search_index_table_test
+  SOURCES ${CMAKE_CURRENT_LIST_DIR}/database/search_index_table_test.cc
+  LIBS lumeris_database SQLite::SQLite3
+  LABELS database)
