@@ -4,6 +4,7 @@
 #include <fstream>
 #include <map>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "resource_builder/character_info.h"
@@ -82,30 +83,18 @@ TEST(HangulNameTest, FollowsTheUnicodeAlgorithm) {
   EXPECT_FALSE(HangulSyllableName(0xD7A4));
 }
 
-TEST(UcdFormatTest, RangesAndSingleCodePoints) {
-  std::vector<CodePointRange> ranges = ParseCodePointRanges(
-      "# comment\n0000..007F; Basic Latin\n\n00AA          ; Latin # Lo FEMININE\nZZZZ..0001; Bad\n0010..0005; Backwards\n");
-  ASSERT_EQ(ranges.size(), 2u);
-  EXPECT_EQ(ranges[0].first, 0u);
-  EXPECT_EQ(ranges[0].last, 0x7Fu);
-  EXPECT_EQ(ranges[0].value, "Basic Latin");
-  EXPECT_EQ(ranges[1].first, 0xAAu);
-  EXPECT_EQ(ranges[1].last, 0xAAu);
-  EXPECT_EQ(ranges[1].value, "Latin");
-}
-
-TEST(UcdFormatTest, CodePointSequences) {
+TEST(UcdFormatTest, RangesSequencesAndAliases) {
+  std::vector<std::tuple<char32_t, char32_t, std::string>> ranges;
+  for (const CodePointRange& r : ParseCodePointRanges("# comment\n0000..007F; Basic Latin\n\n00AA ; Latin # Lo FEMININE\n"
+                                                      "ZZZZ..0001; Bad\n0010..0005; Backwards\n")) {
+    ranges.emplace_back(r.first, r.last, r.value);
+  }
+  EXPECT_EQ(ranges, (decltype(ranges){{0, 0x7F, "Basic Latin"}, {0xAA, 0xAA, "Latin"}}));
   EXPECT_EQ(ParseCodePointSequence("1F44D 1F3FD"), std::u32string(U"\U0001F44D\U0001F3FD"));
-  EXPECT_FALSE(ParseCodePointSequence(""));
-  EXPECT_FALSE(ParseCodePointSequence("110000"));
-  EXPECT_FALSE(ParseCodePointSequence("12G4"));
-}
-
-TEST(NameAliasTest, KeepsFileOrderPerCodePoint) {
+  for (const char* bad : {"", "110000", "12G4"}) EXPECT_FALSE(ParseCodePointSequence(bad)) << bad;
   auto aliases = ParseNameAliases("0000;NULL;control\n0000;NUL;abbreviation\n01A2;LATIN CAPITAL LETTER GHA;correction\n");
   ASSERT_EQ(aliases[0].size(), 2u);
-  EXPECT_EQ(aliases[0][1].alias, "NUL");
-  EXPECT_EQ(aliases[0][1].type, "abbreviation");
+  EXPECT_EQ(aliases[0][1].alias + " " + aliases[0][1].type, "NUL abbreviation");  // file order per code point
   EXPECT_EQ(aliases[0x1A2][0].type, "correction");
 }
 
