@@ -45,24 +45,17 @@ class BundleTest : public ::testing::Test {
   BundleWriter app_;
 };
 
-TEST_F(BundleTest, ApplicationAndFrameworkLayouts) {
-  for (const char* loc : {"fr", "en", "de", "zh-Hant"}) app_.Folder(loc);
+// Localizations are the ".lproj" folders, sorted; a framework keeps Info.plist in Resources.
+TEST_F(BundleTest, LocalizationFoldersAndFrameworkLayout) {
+  for (const char* loc : {"fr", "zh-Hant", "de"}) app_.Folder(loc);
   app_.WriteResource("", "notes.lproj", "a file, not a folder");
   fs::create_directories(app_.Folder("") / ".lproj");
-  const Bundle bundle = OpenApp();
-  EXPECT_EQ(bundle.identifier(), "com.example.Test");
-  EXPECT_EQ(bundle.development_localization(), "en");
-  EXPECT_EQ(bundle.localizations(), (Strings{"de", "en", "fr", "zh-Hant"}));
-
-  // A framework keeps everything, Info.plist included, in Resources.
+  EXPECT_EQ(OpenApp().localizations(), (Strings{"de", "fr", "zh-Hant"}));
   const BundleWriter framework = BundleWriter::Framework(dir_.path() / "Kit.framework", "com.example.Kit", "en");
-  framework.WriteStringsTable("en", "Localizable", {{"Done", "Done"}});
-  const fs::path icon = framework.WriteResource("", "Star.pdf", "%PDF");
   const std::optional<Bundle> kit = Bundle::Open(framework.path());
   ASSERT_TRUE(kit);
   EXPECT_EQ(kit->identifier(), "com.example.Kit");
-  EXPECT_EQ(kit->localizations(), (Strings{"en"}));
-  EXPECT_EQ(kit->PathForResource("Star", "pdf"), icon);
+  EXPECT_EQ(kit->PathForResource("Star", "pdf"), framework.WriteResource("", "Star.pdf", "%PDF"));
 }
 
 // Every resource "<folder>-only" exists in that folder alone; "Everywhere" exists in all.
@@ -110,15 +103,11 @@ TEST_F(BundleTest, ResourceLookupSearchesFoldersInOrder) {
 }
 
 TEST_F(BundleTest, CodeFindsOldStyleFolderAndUnmatchedLanguagesUseDevelopment) {
-  const fs::path english = app_.WriteResource("English", "Note.txt", "x");
-  EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "en"), english);
-
+  EXPECT_EQ(OpenApp().PathForResource("Note", "txt", {}, "en"), app_.WriteResource("English", "Note.txt", "x"));
   testing::SetUserLanguages(env_, "ja");
-  const fs::path en = app_.WriteResource("en", "Other.txt", "x");
   app_.WriteResource("de", "Other.txt", "x");
-  const Bundle bundle = OpenApp();
-  EXPECT_EQ(bundle.PreferredLocalizations(), (Strings{"en"}));
-  EXPECT_EQ(bundle.PathForResource("Other", "txt"), en);
+  EXPECT_EQ(OpenApp().PreferredLocalizations(), (Strings{"en"}));
+  EXPECT_EQ(OpenApp().PathForResource("Other", "txt"), app_.WriteResource("en", "Other.txt", "x"));
 }
 
 TEST_F(BundleTest, LocalizedStringFollowsUserLanguages) {
@@ -138,15 +127,12 @@ TEST_F(BundleTest, LocalizedStringFollowsUserLanguages) {
 }
 
 TEST(OldStyleLocalizationTest, NamesAndCodesMapBothWaysAndNothingElseIsOldStyle) {
-  for (const auto& [name, code] : std::vector<std::pair<std::string, std::string>>{
-           {"English", "en"}, {"French", "fr"}, {"German", "de"}, {"Japanese", "ja"},
-           {"Spanish", "es"}, {"Italian", "it"}, {"Dutch", "nl"}}) {
+  for (const auto& [name, code] : {std::pair{"English", "en"}, {"French", "fr"}, {"German", "de"}, {"Japanese", "ja"},
+                                   {"Spanish", "es"}, {"Italian", "it"}, {"Dutch", "nl"}}) {
     EXPECT_EQ(LanguageCodeForOldStyleLocalization(name), code);
     EXPECT_EQ(OldStyleLocalizationForLanguageCode(code), name);
   }
-  for (const char* name : {"en", "english", "Base", "", "zh-Hans", "Klingon"}) {
-    EXPECT_FALSE(LanguageCodeForOldStyleLocalization(name)) << name;
-  }
+  for (const char* name : {"en", "english", "Base", "", "zh-Hans", "Klingon"}) EXPECT_FALSE(LanguageCodeForOldStyleLocalization(name)) << name;
   EXPECT_FALSE(OldStyleLocalizationForLanguageCode("en-US"));
 }
 

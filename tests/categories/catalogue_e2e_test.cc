@@ -32,13 +32,12 @@ class CatalogueEndToEndTest : public ServiceTest, public ::testing::WithParamInt
 };
 
 bool IsPdf(const MessageValue::Bytes* bytes) {
-  return bytes != nullptr && bytes->size() > 4 && std::string(bytes->begin(), bytes->begin() + 4) == "%PDF";
+  return bytes != nullptr && std::string(bytes->begin(), bytes->end()).starts_with("%PDF");
 }
 
 // The Data string, after `prefix`, denotes at least one character.
 bool HasCharacters(const std::string* data, std::string_view prefix = {}) {
-  if (data == nullptr || data->substr(0, prefix.size()) != prefix) return false;
-  const auto characters = ParseDataString(std::string_view(*data).substr(prefix.size()));
+  const auto characters = data && data->starts_with(prefix) ? ParseDataString(data->substr(prefix.size())) : std::nullopt;
   return characters && !characters->empty();
 }
 
@@ -59,8 +58,7 @@ TEST_P(CatalogueEndToEndTest, EveryOfferedCategoryAnswersWithDataTitleAndIcon) {
 
   MessageValue array = MessageValue::MakeArray();
   for (const std::string& name : names) array.Append(MessageValue::String(name));
-  const std::optional<MessageValue> reply =
-      sendRequest(Command("read_categorydata", {{"categories", array}}), std::chrono::seconds(10));
+  const std::optional<MessageValue> reply = sendRequest(Command("read_categorydata", {{"categories", array}}), 10s);
   ASSERT_TRUE(reply && reply->Find("result") && reply->Find("result")->is_array());
   const MessageValue::Array& entries = *reply->Find("result")->AsArray();
   ASSERT_EQ(entries.size(), names.size());

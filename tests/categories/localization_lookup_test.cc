@@ -15,7 +15,6 @@
 
 #include "bundle/bundle_fixture.h"
 #include "categories/system_bundles.h"
-#include "platform/system_root.h"
 #include "support/scoped_env.h"
 #include "support/temp_dir.h"
 
@@ -27,57 +26,52 @@ using testing::BundleWriter;
 using testing::ScopedEnv;
 using testing::ScopedTempDir;
 using Maybe = std::optional<std::string_view>;
+constexpr Maybe kEmoji = "Emoji_Category";
+constexpr Maybe kDefault = std::nullopt;
 
-// A fixture table's translation names its bundle, localization and table, so every answer shows
-// which file was read.
-std::string Translation(std::string_view bundle, std::string_view loc, std::string_view table,
-                        std::string_view key) {
-  return std::string(bundle) + ":" + std::string(loc) + "/" + std::string(table) + "/" +
-         std::string(key);
-}
-
-// Bundles "app" and "same" (one identifier), "other" and "anon" (no identifier), each with
-// "Localizable" and "Emoji_Category" in en, de and fr holding "Smileys" and "Animals" (and
-// "OnlyInLocalizable" in "Localizable"). The user's language is French. The loader counts loads
-// per file, named like a translation: "app:de/Emoji_Category".
+// Bundles "app" and "same" (one identifier, one folder), "other" (another identifier) and "anon"
+// (none). app holds Emoji_Category in de, fr and en and Localizable in de; other and anon hold
+// de/Emoji_Category. Each table maps "Smileys" to the name of its file ("app:de/Emoji_Category");
+// app's French one also holds "OnlyInFrench". The user's language is French. The loader counts
+// loads per file, by the same name.
 class LocalizationLookupTest : public ::testing::Test {
  protected:
   LocalizationLookupTest()
       : cache_([this](const fs::path& path) -> StringsTableCache::Table {
-          const std::string bundle = path.parent_path().parent_path().parent_path().parent_path().filename();
           std::lock_guard lock(mutex_);
-          ++loads_[bundle + ":" + path.parent_path().stem().string() + "/" + path.stem().string()];
+          ++loads_[path.parent_path().parent_path().parent_path().parent_path().filename().string() + ":" +
+                   path.parent_path().stem().string() + "/" + path.stem().string()];
           auto table = ReadStringsTable(path);
           return table ? std::make_shared<const plist::Dictionary>(std::move(*table)) : nullptr;
         }) {
     testing::SetUserLanguages(env_, "fr");
     for (const std::string name : {"app", "other", "anon"}) {
-      BundleWriter app = BundleWriter::Application(dir_.path() / name, "com.example." + name, "en");
-      for (const char* loc : {"en", "de", "fr"}) {
-        for (const std::string table : {"Localizable", "Emoji_Category"}) {
-          std::map<std::string, std::string> strings;
-          for (const char* key : {"Smileys", "Animals", "OnlyInLocalizable"}) {
-            if (table == "Localizable" || key[0] != 'O') strings[key] = Translation(name, loc, table, key);
-          }
-          app.WriteStringsTable(loc, table, strings);
-        }
-      }
-      if (name == "anon") BundleWriter::WritePlist(app.info_file(), plist::Dictionary{});
-      bundles_.emplace(name, *Bundle::Open(app.path()));
+      const BundleWriter app = BundleWriter::Application(
+          dir_.path() / name, name == "anon" ? std::nullopt : std::optional("com.example." + name), "en");
+      const auto write = [&](const char* loc, const char* table) {
+        std::map<std::string, std::string> strings{{"Smileys", File(name, loc, table)}};
+        if (std::string_view(loc) == "fr") strings.emplace("OnlyInFrench", "French");
+        app.WriteStringsTable(loc, table, strings);
+      };
+      write("de", "Emoji_Category");
+      if (name != "app") continue;
+      write("fr", "Emoji_Category");
+      write("en", "Emoji_Category");
+      write("de", "Localizable");
     }
+    for (const char* name : {"app", "other", "anon"}) bundles_.emplace(name, *Bundle::Open(dir_.path() / name));
     bundles_.emplace("same", *Bundle::Open(dir_.path() / "app"));
   }
 
-  fs::path TableFile(std::string_view loc, std::string_view table) const {
-    return dir_.path() / "app/Contents/Resources" / (std::string(loc) + ".lproj") /
-           (std::string(table) + ".strings");
+  static std::string File(std::string_view bundle, std::string_view loc, std::string_view table) {
+    return std::string(bundle) + ":" + std::string(loc) + "/" + std::string(table);
   }
   std::map<std::string, int> Loads() {
     std::lock_guard lock(mutex_);
     return loads_;
   }
-  std::optional<std::string> Lookup(std::string_view key, Maybe loc, Maybe table,
-                                    Maybe fallback = "default", const char* bundle = "app") {
+  std::optional<std::string> Lookup(std::string_view key, Maybe loc, Maybe table, Maybe fallback = "default",
+                                    const char* bundle = "app") {
     return cache_.Lookup(key, &bundles_.at(bundle), loc, table, fallback);
   }
 
@@ -89,15 +83,11 @@ class LocalizationLookupTest : public ::testing::Test {
   StringsTableCache cache_;
 };
 
-constexpr Maybe kEmoji = "Emoji_Category";
-constexpr Maybe kDefault = std::nullopt;
-
 // Hit and miss rules of the one-entry cache: a run of lookups of "Smileys", each answered from
 // the right file, and every load the run made.
 struct Step {
   const char* bundle;
-  Maybe loc;
-  Maybe table;
+  Maybe loc, table;
 };
 struct CacheCase {
   const char* what;
@@ -112,8 +102,7 @@ TEST_P(CacheRuleTest, LoadsOnlyOnAMiss) {
   for (const Step& s : GetParam().steps) {
     const char* bundle = std::string_view(s.bundle) == "same" ? "app" : s.bundle;
     const std::string_view loc = !s.loc ? "fr" : *s.loc == "English" ? "en" : *s.loc;
-    EXPECT_EQ(Lookup("Smileys", s.loc, s.table, "default", s.bundle),
-              Translation(bundle, loc, s.table.value_or("Localizable"), "Smileys"));
+    EXPECT_EQ(Lookup("Smileys", s.loc, s.table, "default", s.bundle), File(bundle, loc, s.table.value_or("Localizable")));
   }
   EXPECT_EQ(Loads(), GetParam().loads);
 }
@@ -126,7 +115,7 @@ INSTANTIATE_TEST_SUITE_P(
         CacheCase{"the default table reloads every time",
                   {{"app", "de", kDefault}, {"app", "de", kDefault}}, {{"app:de/Localizable", 2}}},
         CacheCase{"a new localization replaces the entry",
-                  {{"app", "de", kEmoji}, {"app", "de", kEmoji}, {"app", "fr", kEmoji}, {"app", "de", kEmoji}},
+                  {{"app", "de", kEmoji}, {"app", "fr", kEmoji}, {"app", "de", kEmoji}},
                   {{"app:de/Emoji_Category", 2}, {"app:fr/Emoji_Category", 1}}},
         CacheCase{"a new table name replaces the entry",
                   {{"app", "de", kEmoji}, {"app", "de", "Localizable"}, {"app", "de", kEmoji}},
@@ -138,81 +127,48 @@ INSTANTIATE_TEST_SUITE_P(
                   {{"app", std::nullopt, kEmoji}, {"app", std::nullopt, kEmoji}}, {{"app:fr/Emoji_Category", 2}}},
         CacheCase{"a bundle without identifier never hits",
                   {{"anon", "de", kEmoji}, {"anon", "de", kEmoji}}, {{"anon:de/Emoji_Category", 2}}},
-        CacheCase{"\"English\" reads the en tables",
-                  {{"app", "English", kEmoji}, {"app", "English", kDefault}},
-                  {{"app:en/Emoji_Category", 1}, {"app:en/Localizable", 1}}}));
+        CacheCase{"\"English\" reads the en tables", {{"app", "English", kEmoji}}, {{"app:en/Emoji_Category", 1}}}));
 
-// Where the answer comes from when the loaded table cannot give it.
-
-TEST_F(LocalizationLookupTest, KeyMissingFromLoadedTableGivesTheDefault) {
-  // "OnlyInLocalizable" is in every Localizable table, and in the user's own language (fr) too.
-  EXPECT_EQ(Lookup("OnlyInLocalizable", "de", kEmoji, "fallback"), "fallback");
-  EXPECT_EQ(Lookup("OnlyInLocalizable", "de", kEmoji, std::nullopt), std::nullopt);
-  BundleWriter::WritePlist(TableFile("fr", "Emoji_Category"), plist::Dictionary{{"Smileys", 42}});
-  EXPECT_EQ(Lookup("Smileys", "fr", kEmoji, "fallback"), "fallback") << "a wrong-typed value";
-}
-
-TEST_F(LocalizationLookupTest, MissingOrUnreadableTableAsksTheBundleInTheUsersLanguage) {
-  fs::remove(TableFile("de", "Emoji_Category"));
-  EXPECT_EQ(Lookup("Smileys", "de", kEmoji), Translation("app", "fr", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Unknown", "de", kEmoji, "fallback"), "fallback");
-  EXPECT_EQ(Lookup("Smileys", "de", "NoSuchTable", "fallback"), "fallback");
-
-  // An unreadable table is cached as missing: loaded once for two lookups.
-  BundleWriter::WriteFile(TableFile("en", "Emoji_Category"), "not a property list");
-  EXPECT_EQ(Lookup("Smileys", "en", kEmoji), Translation("app", "fr", "Emoji_Category", "Smileys"));
-  EXPECT_EQ(Lookup("Animals", "en", kEmoji), Translation("app", "fr", "Emoji_Category", "Animals"));
+// Where the answer comes from when the loaded table cannot give it: a loaded table answers alone;
+// a missing or unreadable one (loaded once all the same) leaves it to the bundle, in the user's
+// language.
+TEST_F(LocalizationLookupTest, AnswersFromTheLoadedTableElseFromTheBundle) {
+  EXPECT_EQ(Lookup("OnlyInFrench", "de", kEmoji, "fallback"), "fallback");
+  EXPECT_EQ(Lookup("OnlyInFrench", "de", kEmoji, std::nullopt), std::nullopt);
+  EXPECT_EQ(Lookup("OnlyInFrench", "ja", kEmoji), "French");
+  EXPECT_EQ(Lookup("Smileys", "ja", "NoSuchTable", "fallback"), "fallback");
+  BundleWriter::WriteFile(dir_.path() / "app/Contents/Resources/en.lproj/Emoji_Category.strings", "not a plist");
+  EXPECT_EQ(Lookup("Smileys", "en", kEmoji), "app:fr/Emoji_Category");
+  EXPECT_EQ(Lookup("OnlyInFrench", "en", kEmoji), "French");
   EXPECT_EQ(Loads()["app:en/Emoji_Category"], 1);
-
+  BundleWriter::WritePlist(dir_.path() / "app/Contents/Resources/fr.lproj/Emoji_Category.strings",
+                           plist::Dictionary{{"Smileys", 42}});
+  EXPECT_EQ(Lookup("Smileys", "fr", kEmoji, "fallback"), "fallback") << "a wrong-typed value";
   EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", kEmoji, "fallback"), "fallback");
   EXPECT_EQ(cache_.Lookup("Smileys", nullptr, "de", kEmoji, std::nullopt), std::nullopt);
+
+  const Bundle& app = bundles_.at("app");
+  EXPECT_EQ(LocalizedStringForLanguage("Smileys", &app, "de", kEmoji, "default"), "app:de/Emoji_Category");
+  // The user's languages choose among the bundle's localizations; no match is "English", not the
+  // development localization.
+  EXPECT_EQ(PreferredLocalizationOfBundle(&app), "fr");
+  testing::SetUserLanguages(env_, "ja");
+  EXPECT_EQ(PreferredLocalizationOfBundle(&app), "English");
+  EXPECT_EQ(PreferredLocalizationOfBundle(nullptr), "English");
 }
 
 TEST_F(LocalizationLookupTest, ConcurrentLookupsAlwaysReadTheirOwnTable) {
   std::atomic<int> wrong{0};
   std::vector<std::thread> threads;
   for (const auto& [loc, table] : std::vector<std::pair<const char*, Maybe>>{
-           {"de", kEmoji}, {"fr", kEmoji}, {"en", kDefault}, {"de", "Localizable"}}) {
+           {"de", kEmoji}, {"fr", kEmoji}, {"de", kDefault}, {"en", kEmoji}}) {
     threads.emplace_back([&, loc, table] {
-      const std::string expected = Translation("app", loc, table.value_or("Localizable"), "Animals");
-      for (int i = 0; i < 300; ++i) wrong += Lookup("Animals", loc, table) != expected;
+      const std::string expected = File("app", loc, table.value_or("Localizable"));
+      for (int i = 0; i < 300; ++i) wrong += Lookup("Smileys", loc, table) != expected;
     });
   }
   for (std::thread& thread : threads) thread.join();
   EXPECT_EQ(wrong.load(), 0);
-}
-
-TEST_F(LocalizationLookupTest, ProcessWideLookupReadsRealFiles) {
-  const Bundle& app = bundles_.at("app");
-  EXPECT_EQ(LocalizedStringForLanguage("Animals", &app, "de", kEmoji, "default"),
-            Translation("app", "de", "Emoji_Category", "Animals"));
-  EXPECT_EQ(LocalizedStringForLanguage("Nope", &app, "English", kDefault, "default"), "default");
-}
-
-TEST(PreferredLocalizationOfBundleTest, ChoosesAmongTheBundlesLocalizationsElseEnglish) {
-  const struct {
-    const char* what;
-    std::vector<std::string> localizations;
-    std::optional<std::string> languages;  // LANGUAGE
-    const char* expected;
-  } cases[] = {
-      {"first language that matches", {"en", "de", "fr"}, "it:fr_CA:de", "fr"},
-      {"regional variant", {"en", "pt", "pt-PT"}, "pt_PT.UTF-8", "pt-PT"},
-      {"old-style folder", {"German", "French"}, "de_DE", "German"},
-      {"no match is English, not the development localization", {"de", "fr"}, "ja", "English"},
-      {"no languages at all", {"de", "fr"}, std::nullopt, "English"},
-      {"no localizations", {}, "de", "English"},
-  };
-  for (const auto& c : cases) {
-    ScopedTempDir dir;
-    ScopedEnv env;
-    testing::SetUserLanguages(env, c.languages);
-    const BundleWriter app = BundleWriter::Application(dir.path() / "A.app", "com.example.A", "de");
-    for (const std::string& loc : c.localizations) app.Folder(loc);
-    const Bundle bundle = *Bundle::Open(app.path());
-    EXPECT_EQ(PreferredLocalizationOfBundle(&bundle), c.expected) << c.what;
-  }
-  EXPECT_EQ(PreferredLocalizationOfBundle(nullptr), "English");
 }
 
 // The system bundles under LUMERIS_SYSTEM_ROOT. The framework bundle is process-wide, so its whole
@@ -224,20 +180,20 @@ TEST(SystemBundlesTest, OpenUnderTheSystemRootAndTheFrameworkIsKept) {
   testing::SetUserLanguages(env, "de");
 
   EXPECT_FALSE(OpenApplicationBundle());
-  BundleWriter::Application(SystemPath(kApplicationBundlePath), "com.vantorel.SorvendiIM", "en");
+  BundleWriter::Application(root.path() / "System/Library/Input Methods/Sorvendi.app", "com.example.App", "en");
   const auto app = OpenApplicationBundle();
   ASSERT_TRUE(app);
-  EXPECT_EQ(app->identifier(), "com.vantorel.SorvendiIM");
-  EXPECT_EQ(app->path(), root.path() / "System/Library/Input Methods/Sorvendi.app");
+  EXPECT_EQ(app->identifier(), "com.example.App");
 
   EXPECT_EQ(MyFrameworkBundle(), nullptr);
   EXPECT_EQ(MyFrameworkLocalizedString("Close"), "Close");
-  BundleWriter framework = BundleWriter::Framework(SystemPath(kFrameworkBundlePath), "com.vantorel.Lumeris", "en");
+  BundleWriter framework = BundleWriter::Framework(
+      root.path() / "System/Library/PrivateFrameworks/Lumeris.framework", "com.example.Framework", "en");
   framework.WriteStringsTable("en", "Localizable", {{"Close", "Close"}, {"Done", "Done"}});
   framework.WriteStringsTable("de", "Localizable", {{"Close", "Schließen"}});
   const Bundle* found = MyFrameworkBundle();
   ASSERT_NE(found, nullptr);
-  EXPECT_EQ(found->identifier(), "com.vantorel.Lumeris");
+  EXPECT_EQ(found->identifier(), "com.example.Framework");
   EXPECT_EQ(MyFrameworkLocalizedString("Close"), "Schließen");
   EXPECT_EQ(MyFrameworkLocalizedString("Done"), "Done");
   EXPECT_EQ(MyFrameworkLocalizedString("Missing"), "Missing");

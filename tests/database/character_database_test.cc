@@ -31,25 +31,20 @@ std::string Info(const std::string& unam, const std::string& later = "") {
   return unam + "|" + later + std::string(14, '|');
 }
 
-void Execute(sqlite3* db, const std::string& sql) {
-  char* error = nullptr;
-  ASSERT_EQ(sqlite3_exec(db, sql.c_str(), nullptr, nullptr, &error), SQLITE_OK) << error;
-}
-
-void WriteTable(const std::filesystem::path& path, const std::string& create,
-                const std::string& insert, const Rows& rows) {
+// Writes `table` with the columns `columns` and rows of two texts each.
+void WriteTable(const std::filesystem::path& path, const std::string& table, const std::string& columns, const Rows& rows) {
   sqlite3* db = nullptr;
   ASSERT_EQ(sqlite3_open(path.c_str(), &db), SQLITE_OK);
-  Execute(db, create);
+  ASSERT_EQ(sqlite3_exec(db, ("create table " + table + " (" + columns + ")").c_str(), nullptr, nullptr, nullptr), SQLITE_OK);
+  sqlite3_stmt* insert = nullptr;
+  ASSERT_EQ(sqlite3_prepare_v2(db, ("insert into " + table + " values (?, ?)").c_str(), -1, &insert, nullptr), SQLITE_OK);
   for (const auto& [first, second] : rows) {
-    sqlite3_stmt* statement = nullptr;
-    ASSERT_EQ(sqlite3_prepare_v2(db, insert.c_str(), -1, &statement, nullptr), SQLITE_OK);
-    sqlite3_bind_text(statement, 1, first.data(), static_cast<int>(first.size()), SQLITE_TRANSIENT);
-    sqlite3_bind_text(statement, 2, second.data(), static_cast<int>(second.size()),
-                      SQLITE_TRANSIENT);
-    EXPECT_EQ(sqlite3_step(statement), SQLITE_DONE);
-    sqlite3_finalize(statement);
+    sqlite3_bind_text(insert, 1, first.data(), static_cast<int>(first.size()), SQLITE_TRANSIENT);
+    sqlite3_bind_text(insert, 2, second.data(), static_cast<int>(second.size()), SQLITE_TRANSIENT);
+    EXPECT_EQ(sqlite3_step(insert), SQLITE_DONE);
+    sqlite3_reset(insert);
   }
+  sqlite3_finalize(insert);
   sqlite3_close(db);
 }
 
@@ -58,52 +53,37 @@ class CharacterDatabaseTest : public ::testing::TestWithParam<LMCharacterDatabas
  protected:
   // Writes CharacterDB with (uchr, info) rows; `info_column` names the second column.
   void WriteCharacters(const Rows& rows, const std::string& info_column = "info") {
-    WriteTable(dir_.path() / "CharacterDB.sqlite3",
-               "create table unihan_dict (uchr text, " + info_column + " text)",
-               "insert into unihan_dict values (?, ?)", rows);
+    WriteTable(dir_.path() / "CharacterDB.sqlite3", "unihan_dict", "uchr text, " + info_column + " text", rows);
   }
   void WriteRelated(const Strings& groups) {
     Rows rows;
     for (const std::string& group : groups) rows.emplace_back(group, "");
-    WriteTable(dir_.path() / "RelatedCharDB.sqlite3",
-               "create table related_dict (relatedChars text, unused text)",
-               "insert into related_dict values (?, ?)", rows);
+    WriteTable(dir_.path() / "RelatedCharDB.sqlite3", "related_dict", "relatedChars text, unused text", rows);
   }
 
   LMCharacterDatabase& Database() {
     if (!database_) {
-      FontQueries fonts{
-          .emoji_font_draws =
-              [this](const icu::UnicodeString& s) {
-                return emoji_.count(EncodeUtf8Lenient(s)) > 0;
-              },
-          .default_like_font_draws =
-              [this](const icu::UnicodeString& s) {
-                return !undrawable_.count(EncodeUtf8Lenient(s));
-              },
+      const auto in = [](const std::set<std::string>& set) {
+        return [&set](const icu::UnicodeString& s) { return set.contains(EncodeUtf8Lenient(s)); };
+      };
+      const auto lookup = [this](std::string_view name, std::string_view type) -> std::optional<std::filesystem::path> {
+        looked_up_.emplace_back(name);
+        const std::filesystem::path path = dir_.path() / (std::string(name) + "." + std::string(type));
+        return std::filesystem::exists(path) ? std::optional(path) : std::nullopt;
       };
       database_ = std::make_unique<LMCharacterDatabase>(
-          [this](std::string_view name,
-                 std::string_view type) -> std::optional<std::filesystem::path> {
-            looked_up_.emplace_back(name);
-            std::filesystem::path path =
-                dir_.path() / (std::string(name) + "." + std::string(type));
-            if (!std::filesystem::exists(path)) return std::nullopt;
-            return path;
-          },
-          fonts, GetParam());
+          lookup, FontQueries{.emoji_font_draws = in(emoji_), .default_like_font_draws = std::not_fn(in(undrawable_))},
+          GetParam());
     }
     return *database_;
   }
 
   // The strings of an array result; "null" for a null result.
   Strings Search(const std::string& text, std::uint64_t limit) {
-    return Flatten(Database().createXPCArrayForSearchString(*DecodeUtf8(text),
-                                                            static_cast<std::int64_t>(limit)));
+    return Flatten(Database().createXPCArrayForSearchString(*DecodeUtf8(text), static_cast<std::int64_t>(limit)));
   }
   Strings Related(const std::string& text, std::uint64_t limit) {
-    return Flatten(Database().createXPCArrayForRelatedCharacters(*DecodeUtf8(text),
-                                                                 static_cast<std::int64_t>(limit)));
+    return Flatten(Database().createXPCArrayForRelatedCharacters(*DecodeUtf8(text), static_cast<std::int64_t>(limit)));
   }
   static Strings Flatten(const MessageValue& value) {
     if (value.is_null()) return {"null"};
@@ -111,6 +91,7 @@ class CharacterDatabaseTest : public ::testing::TestWithParam<LMCharacterDatabas
     for (const MessageValue& element : *value.AsArray()) strings.push_back(*element.AsString());
     return strings;
   }
+  MessageValue Record(const char* character) { return Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8(character)); }
 
   testing::ScopedTempDir dir_;
   std::set<std::string> emoji_;       // what the emoji font draws
@@ -170,16 +151,9 @@ TEST_P(CharacterDatabaseTest, SearchRules) {
 }
 
 TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest) {
-  WriteCharacters({{"n1", Info("x")},
-                   {"e1", Info("x")},
-                   {"n2", Info("x")},
-                   {"e2", Info("x")},
-                   {"e3", Info("x")}});
+  WriteCharacters({{"n1", Info("x")}, {"e1", Info("x")}, {"n2", Info("x")}, {"e2", Info("x")}, {"e3", Info("x")}});
   emoji_ = {"e1", "e2", "e3"};
-  const struct {
-    std::uint64_t limit;
-    Strings expected;
-  } kCases[] = {
+  const std::pair<std::uint64_t, Strings> kCases[] = {
       {0, {"e1"}},
       {1, {"e1"}},
       {2, {"e1", "e2"}},
@@ -188,7 +162,7 @@ TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest
       {std::uint64_t{1} << 63, {"e1", "e2", "e3"}},
       {UINT64_MAX, {"e1", "e2", "e3"}},
   };
-  for (const auto& c : kCases) EXPECT_EQ(Search("x", c.limit), c.expected) << c.limit;
+  for (const auto& [limit, expected] : kCases) EXPECT_EQ(Search("x", limit), expected) << limit;
 }
 
 TEST_P(CharacterDatabaseTest, RelatedCharacters) {
@@ -199,85 +173,61 @@ TEST_P(CharacterDatabaseTest, RelatedCharacters) {
     std::uint64_t limit;
     Strings expected;
   } kCases[] = {
-      {"a",
-       10,
-       {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
+      {"a", 10, {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
       {"A", 10, {"a", "á", "a"}},
       {"a", 1, {"A"}},
       {"a", 0, {}},
       {"a", std::uint64_t{1} << 63, {}},
-      {"👍🏽",
-       10,
-       {"👍", "👍", "🏽", "👍", "🏽", "👍", "🏿"}},  // split by code point, pairs kept
+      {"👍🏽", 10, {"👍", "👍", "🏽", "👍", "🏽", "👍", "🏿"}},  // split by code point, pairs kept
       {"👍🏽", 4, {"👍", "👍", "🏽", "👍"}},
       {"%", 10, {"q"}},  // escaped: only the row holding a real "%"
       {"_", 10, {"b"}},
       {"z", 10, {"x", "y"}},
   };
-  for (const auto& c : kCases)
-    EXPECT_EQ(Related(c.text, c.limit), c.expected) << c.text << " " << c.limit;
+  for (const auto& c : kCases) EXPECT_EQ(Related(c.text, c.limit), c.expected) << c.text << " " << c.limit;
   EXPECT_THAT(looked_up_, ElementsAre("RelatedCharDB"));
 }
 
+// A record holds the sixteen fields under their tags; rows of another field count, and rows of a
+// table whose second column has a long name, hold none.
 TEST_P(CharacterDatabaseTest, InformationRecords) {
-  const std::string full = "middle|chuu|jung|zhong|||4|zung1|L|||ㄓㄨㄥ|2.3|||";
+  const std::string sixteen = "f0|f1|f2|f3|f4|f5|f6|f7|f8|f9|f10|f11|f12|f13|f14|f15";
   WriteCharacters({
-      {"中", full},
+      {"中", sixteen},
       {"十五", std::string(14, '|')},
       {"十七", std::string(16, '|')},
-      {"兩", "x" + std::string(15, '|') + "y"},
       {"同", std::string(14, '|')},  // a row of fifteen fields, then a usable row for the same key
       {"同", "same" + std::string(15, '|')},
       {"👍", "thumbs up" + std::string(15, '|')},
       {"☝\uFE0F", "index pointing up" + std::string(15, '|')},
   });
-  const struct {
-    const char* character;
-    const char* unam;  // nullptr: no record
-  } kCases[] = {
-      {"中", "middle"},
-      {"十五", nullptr},
-      {"十七", nullptr},
-      {"同", "same"},
-      {"无", nullptr},
-      {"👍🏽", "thumbs up"},
-      {"👍", "thumbs up"},
-      {"☝🏽", "index pointing up"},
-      {"☝", "index pointing up"},
-  };
-  for (const auto& c : kCases) {
-    MessageValue record = Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8(c.character));
-    ASSERT_TRUE(record.is_dictionary()) << c.character;
-    if (c.unam == nullptr) {
-      EXPECT_TRUE(record.AsDictionary()->empty()) << c.character;
-    } else {
-      EXPECT_EQ(record.AsDictionary()->size(), 16u) << c.character;
-      EXPECT_EQ(*record.GetString("unam"), c.unam) << c.character;
-    }
+  const MessageValue middle = Record("中");
+  const std::pair<const char*, const char*> kTags[] = {
+      {"unam", "f0"},  {"jyom", "f1"},  {"krpi", "f2"},  {"spin", "f3"},  {"swbx", "f4"},  {"swbh", "f5"},
+      {"sbix", "f6"},  {"cbai", "f7"},  {"tcan", "f8"},  {"tday", "f9"},  {"tpin", "f10"}, {"tzhu", "f11"},
+      {"rsu1", "f12"}, {"rsu2", "f13"}, {"rsu3", "f14"}, {"rsu4", "f15"}};
+  ASSERT_TRUE(middle.is_dictionary());
+  EXPECT_EQ(middle.AsDictionary()->size(), 16u);
+  for (const auto& [tag, value] : kTags) EXPECT_EQ(middle.GetString(tag) ? *middle.GetString(tag) : "-", value) << tag;
+  const std::pair<const char*, const char*> kNames[] = {
+      {"十五", nullptr}, {"十七", nullptr}, {"同", "same"}, {"无", nullptr}, {"👍🏽", "thumbs up"},
+      {"👍", "thumbs up"}, {"☝🏽", "index pointing up"}, {"☝", "index pointing up"}};
+  for (const auto& [character, unam] : kNames) {
+    const MessageValue record = Record(character);
+    ASSERT_TRUE(record.is_dictionary()) << character;
+    EXPECT_EQ(record.GetString("unam") ? *record.GetString("unam") : "none", unam ? unam : "none") << character;
+    EXPECT_EQ(record.AsDictionary()->size(), unam ? 16u : 0u) << character;
   }
-  std::optional<CharacterInfoRecord> middle = Database().searchCharacterInfo(*DecodeUtf8("中"));
-  ASSERT_TRUE(middle);
-  EXPECT_EQ((*middle)["cbai"], "zung1");
-  EXPECT_EQ((*middle)["tzhu"], "ㄓㄨㄥ");
-  EXPECT_EQ((*middle)["rsu1"], "2.3");
-  std::optional<CharacterInfoRecord> sparse = Database().searchCharacterInfo(*DecodeUtf8("兩"));
-  ASSERT_TRUE(sparse);
-  EXPECT_EQ((*sparse)["unam"], "x");
-  EXPECT_EQ((*sparse)["rsu4"], "y");
-  EXPECT_EQ((*sparse)["swbx"], "");
-}
-
-TEST_P(CharacterDatabaseTest, SecondColumnWithALongNameHoldsNoRecord) {
-  WriteCharacters({{"中", "middle" + std::string(15, '|')}}, "information");
-  EXPECT_TRUE(
-      Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
+  database_.reset();
+  std::filesystem::remove(dir_.path() / "CharacterDB.sqlite3");
+  WriteCharacters({{"中", sixteen}}, "information");
+  EXPECT_TRUE(Record("中").AsDictionary()->empty());
 }
 
 TEST_P(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAreNotReopened) {
   EXPECT_THAT(Search("heart", 10), ElementsAre("null"));
   EXPECT_THAT(Related("a", 10), ElementsAre());
-  EXPECT_TRUE(
-      Database().createXPCDictionaryForCharacterInfo(*DecodeUtf8("中")).AsDictionary()->empty());
+  EXPECT_TRUE(Record("中").AsDictionary()->empty());
   // The stored handles are kept: files that appear later are not seen by this object.
   WriteCharacters({{"♥", Info("heart")}});
   EXPECT_THAT(Search("heart", 10), ElementsAre("null"));
@@ -286,14 +236,9 @@ TEST_P(CharacterDatabaseTest, MissingDatabasesGiveEachRequestsFailureResultAndAr
 
 TEST_P(CharacterDatabaseTest, LanguageListIsLoadedOnceFoundAndLookedForUntilThen) {
   EXPECT_FALSE(Database().languageForFieldTag("jyom"));
-  plist::Value list = plist::Dictionary{
-      {"tags", plist::Dictionary{{"jyom", "ja"}}},
-      {"languages", plist::Dictionary{{"ja", plist::Array{"jyom"}}}},
-  };
-  const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(list);
-  std::ofstream(dir_.path() / "HanLanguageInfo.plist", std::ios::binary)
-      .write(reinterpret_cast<const char*>(bytes.data()),
-             static_cast<std::streamsize>(bytes.size()));
+  const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(plist::Dictionary{
+      {"tags", plist::Dictionary{{"jyom", "ja"}}}, {"languages", plist::Dictionary{{"ja", plist::Array{"jyom"}}}}});
+  std::ofstream(dir_.path() / "HanLanguageInfo.plist", std::ios::binary).write(reinterpret_cast<const char*>(bytes.data()), std::ssize(bytes));
   EXPECT_EQ(Database().languageForFieldTag("jyom"), plist::Value("ja"));
   EXPECT_EQ(Database().tagsForLanguage("ja"), plist::Value(plist::Array{"jyom"}));
   EXPECT_FALSE(Database().languageForFieldTag("unam"));

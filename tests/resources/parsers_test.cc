@@ -1,19 +1,24 @@
 // Unit tests of the resource builder's parsers and encoders on small inline inputs.
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <map>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "resource_builder/character_info.h"
 #include "resource_builder/cldr_annotations.h"
 #include "resource_builder/cldr_labels.h"
 #include "resource_builder/emoji_test.h"
+#include "resource_builder/han_language_info.h"
 #include "resource_builder/related_chars.h"
 #include "resource_builder/ucd_format.h"
 #include "resource_builder/unicode_data.h"
 #include "resource_builder/unihan.h"
 #include "resource_builder/utf8.h"
 #include "resource_builder/zhuyin.h"
+#include "support/temp_dir.h"
 
 namespace lumeris::resources {
 namespace {
@@ -47,28 +52,22 @@ class UnicodeDataTest : public ::testing::Test {
   }
 };
 
-TEST_F(UnicodeDataTest, RangesExpandWithDerivedNames) {
+TEST_F(UnicodeDataTest, RangesExpandWithDerivedNamesAndOnlyCharactersAreListed) {
   EXPECT_EQ(NameOf(0x4E00), "CJK UNIFIED IDEOGRAPH-4E00");
-  EXPECT_EQ(NameOf(0x4E01), "CJK UNIFIED IDEOGRAPH-4E01");
   EXPECT_EQ(NameOf(0x4E02), "CJK UNIFIED IDEOGRAPH-4E02");
   EXPECT_EQ(NameOf(0xAC01), "HANGUL SYLLABLE GAG");
+  EXPECT_EQ(NameOf(0x0000), "");
   EXPECT_EQ(table_.Find(0x4E03), nullptr);
-}
-
-TEST_F(UnicodeDataTest, ListsNeitherSurrogatesNorPrivateUse) {
+  EXPECT_EQ(table_.Find(U'a')->simple_uppercase, U'A');
+  EXPECT_EQ(table_.Find(U'A')->simple_lowercase, U'a');
   size_t listed = 0;
   for (const CodePointRecord& record : table_.records()) listed += IsListedCharacter(record) ? 1 : 0;
-  // 9 single records + 3 ideographs + 2 syllables; the malformed line is skipped.
+  // 9 single records + 3 ideographs + 2 syllables; the malformed line, surrogates and private use
+  // are not listed.
   EXPECT_EQ(listed, 14u);
   ASSERT_NE(table_.Find(0xE000), nullptr);
   EXPECT_FALSE(IsListedCharacter(*table_.Find(0xE000)));
   EXPECT_FALSE(IsListedCharacter(*table_.Find(0xD800)));
-}
-
-TEST_F(UnicodeDataTest, ControlsHaveNoNameButKeepCaseMappings) {
-  EXPECT_EQ(NameOf(0x0000), "");
-  EXPECT_EQ(table_.Find(U'a')->simple_uppercase, U'A');
-  EXPECT_EQ(table_.Find(U'A')->simple_lowercase, U'a');
 }
 
 TEST(HangulNameTest, FollowsTheUnicodeAlgorithm) {
@@ -84,43 +83,19 @@ TEST(HangulNameTest, FollowsTheUnicodeAlgorithm) {
   EXPECT_FALSE(HangulSyllableName(0xD7A4));
 }
 
-TEST(UcdFormatTest, RangesAndSingleCodePoints) {
-  std::vector<CodePointRange> ranges = ParseCodePointRanges(
-      "# comment\n0000..007F; Basic Latin\n\n00AA          ; Latin # Lo FEMININE\nZZZZ..0001; Bad\n0010..0005; Backwards\n");
-  ASSERT_EQ(ranges.size(), 2u);
-  EXPECT_EQ(ranges[0].first, 0u);
-  EXPECT_EQ(ranges[0].last, 0x7Fu);
-  EXPECT_EQ(ranges[0].value, "Basic Latin");
-  EXPECT_EQ(ranges[1].first, 0xAAu);
-  EXPECT_EQ(ranges[1].last, 0xAAu);
-  EXPECT_EQ(ranges[1].value, "Latin");
-}
-
-TEST(UcdFormatTest, CodePointSequences) {
+TEST(UcdFormatTest, RangesSequencesAndAliases) {
+  std::vector<std::tuple<char32_t, char32_t, std::string>> ranges;
+  for (const CodePointRange& r : ParseCodePointRanges("# comment\n0000..007F; Basic Latin\n\n00AA ; Latin # Lo FEMININE\n"
+                                                      "ZZZZ..0001; Bad\n0010..0005; Backwards\n")) {
+    ranges.emplace_back(r.first, r.last, r.value);
+  }
+  EXPECT_EQ(ranges, (decltype(ranges){{0, 0x7F, "Basic Latin"}, {0xAA, 0xAA, "Latin"}}));
   EXPECT_EQ(ParseCodePointSequence("1F44D 1F3FD"), std::u32string(U"\U0001F44D\U0001F3FD"));
-  EXPECT_FALSE(ParseCodePointSequence(""));
-  EXPECT_FALSE(ParseCodePointSequence("110000"));
-  EXPECT_FALSE(ParseCodePointSequence("12G4"));
-}
-
-TEST(NameAliasTest, KeepsFileOrderPerCodePoint) {
+  for (const char* bad : {"", "110000", "12G4"}) EXPECT_FALSE(ParseCodePointSequence(bad)) << bad;
   auto aliases = ParseNameAliases("0000;NULL;control\n0000;NUL;abbreviation\n01A2;LATIN CAPITAL LETTER GHA;correction\n");
   ASSERT_EQ(aliases[0].size(), 2u);
-  EXPECT_EQ(aliases[0][1].alias, "NUL");
-  EXPECT_EQ(aliases[0][1].type, "abbreviation");
+  EXPECT_EQ(aliases[0][1].alias + " " + aliases[0][1].type, "NUL abbreviation");  // file order per code point
   EXPECT_EQ(aliases[0x1A2][0].type, "correction");
-}
-
-TEST(UnihanTest, KeepsOnlyRequestedFields) {
-  UnihanTable table;
-  std::string_view fields[] = {"kMandarin", "kDefinition"};
-  AddUnihanRecords("# header\nU+5FC3\tkMandarin\txīn\nU+5FC3\tkCantonese\tsam1\nU+5FC3\tkDefinition\theart; mind\n"
-                   "U+ZZZZ\tkMandarin\tbad\nU+6C34\tkMandarin\n",
-                   fields, table);
-  EXPECT_EQ(table.Field(U'心', "kMandarin"), "xīn");
-  EXPECT_EQ(table.Field(U'心', "kDefinition"), "heart; mind");
-  EXPECT_EQ(table.Field(U'心', "kCantonese"), "");
-  EXPECT_EQ(table.entries().size(), 1u);
 }
 
 TEST(UnihanTest, VariantValuesDropSourceAnnotations) {
@@ -128,36 +103,21 @@ TEST(UnihanTest, VariantValuesDropSourceAnnotations) {
   EXPECT_TRUE(ParseUnihanCodePoints("").empty());
 }
 
-TEST(ZhuyinTest, ConvertsTonedPinyinSyllables) {
-  struct Case {
-    const char* pinyin;
-    const char* zhuyin;
-  };
-  const Case cases[] = {
+TEST(ZhuyinTest, ConvertsTonedPinyinSyllablesOnly) {
+  const std::pair<const char*, const char*> cases[] = {
       {"xīn", "ㄒㄧㄣ"},  {"shuǐ", "ㄕㄨㄟˇ"}, {"lǜ", "ㄌㄩˋ"},   {"zhī", "ㄓ"},   {"sì", "ㄙˋ"},
       {"yuè", "ㄩㄝˋ"}, {"wǒ", "ㄨㄛˇ"},   {"jiǔ", "ㄐㄧㄡˇ"}, {"qù", "ㄑㄩˋ"}, {"lùn", "ㄌㄨㄣˋ"},
       {"ér", "ㄦˊ"},    {"ma", "˙ㄇㄚ"},   {"yīng", "ㄧㄥ"},  {"xióng", "ㄒㄩㄥˊ"}, {"wēng", "ㄨㄥ"},
+      {"", "<none>"},   {"q", "<none>"},   {"xyz", "<none>"}, {"ab1", "<none>"}, {"心", "<none>"},
   };
-  for (const Case& c : cases) EXPECT_EQ(PinyinToZhuyin(c.pinyin).value_or("<none>"), c.zhuyin) << c.pinyin;
+  for (const auto& [pinyin, zhuyin] : cases) EXPECT_EQ(PinyinToZhuyin(pinyin).value_or("<none>"), zhuyin) << pinyin;
 }
 
-TEST(ZhuyinTest, RejectsWhatIsNotPinyin) {
-  for (const char* text : {"", "q", "xyz", "ab1", "心"}) EXPECT_FALSE(PinyinToZhuyin(text)) << text;
-}
-
-constexpr std::string_view kAnnotations = R"(<?xml version="1.0" encoding="UTF-8" ?>
-<ldml><annotations>
-  <annotation cp="😀">face | grin | grinning face</annotation>
-  <annotation cp="😀" type="tts">grinning face</annotation>
-  <annotation cp="|">bar | pipe</annotation>
-  <annotation cp="x">↑↑↑</annotation>
-</annotations></ldml>)";
-
-TEST(CldrAnnotationsTest, SplitsKeywordsAndNames) {
+TEST(CldrAnnotationsTest, SplitsKeywordsAndSkipsInheritanceMarkers) {
   CldrAnnotations annotations;
-  ASSERT_TRUE(AddCldrAnnotations(kAnnotations, annotations));
-  EXPECT_EQ(annotations.at("😀").name, "grinning face");
-  EXPECT_EQ(annotations.at("😀").keywords, (std::vector<std::string>{"face", "grin", "grinning face"}));
+  ASSERT_TRUE(AddCldrAnnotations(R"(<ldml><annotations>
+      <annotation cp="|">bar | pipe</annotation>
+      <annotation cp="x">↑↑↑</annotation></annotations></ldml>)", annotations));
   EXPECT_EQ(annotations.at("|").keywords, (std::vector<std::string>{"bar", "pipe"}));
   EXPECT_FALSE(annotations.contains("x"));
   EXPECT_FALSE(AddCldrAnnotations("<ldml><unclosed>", annotations));
@@ -259,38 +219,136 @@ TEST(HanVariantGroupsTest, UnitesVariantsTransitively) {
   EXPECT_EQ(groups, (std::vector<std::u32string>{U"发發髮", U"水氵"}));
 }
 
-TEST(InfoFieldsTest, AlwaysSixteenFieldsWhateverTheText) {
+TEST(InfoFieldsTest, AlwaysSixteenFieldsAndNamePartsWithoutRepeats) {
   InfoFields fields;
   fields[0] = "vertical line; bar | pipe";
   fields[5] = "line\nbreak";
-  std::string info = JoinInfoFields(fields);
-  EXPECT_EQ(std::count(info.begin(), info.end(), '|'), 15);
-  EXPECT_EQ(info.find('\n'), std::string::npos);
-}
-
-TEST(InfoFieldsTest, NamePartsDropRepeatsIgnoringCase) {
+  EXPECT_EQ(JoinInfoFields(fields), "vertical line; bar / pipe|||||line break||||||||||");
   EXPECT_EQ(JoinNameParts({"GRINNING FACE", "grinning face", "", "face", "Face", "grin"}), "GRINNING FACE; face; grin");
 }
 
-TEST(InfoFieldsTest, HanFieldsComeFromUnihan) {
-  UnihanTable table;
-  AddUnihanRecords("U+5FC3\tkJapaneseOn\tSHIN\nU+5FC3\tkJapaneseKun\tKOKORO\nU+5FC3\tkHangul\t심:0E\n"
-                   "U+5FC3\tkKorean\tSIM\nU+5FC3\tkMandarin\txīn\nU+5FC3\tkRSUnicode\t61.0 61'.0\n",
-                   kUnihanFieldsUsed, table);
-  InfoFields fields = HanInfoFields(U'心', table);
-  auto field = [&](std::string_view tag) {
-    return fields[static_cast<size_t>(std::find(kCharacterInfoFieldTags.begin(), kCharacterInfoFieldTags.end(), tag) -
-                                      kCharacterInfoFieldTags.begin())];
+// The rows of the character database over tiny inputs in which every source (Unicode name, alias,
+// English CLDR file, emoji-test name, Unihan property) holds a text no other source holds, so a
+// field filled from the wrong source shows. Decoys: a figment alias, German annotations, Unihan
+// properties the fields do not use, malformed Unihan lines.
+class CharacterRowsTest : public ::testing::Test {
+ protected:
+  CharacterRowsTest() {
+    const auto write = [&](const char* file, const char* annotations) {
+      std::filesystem::create_directories((cldr_.path() / file).parent_path());
+      std::ofstream(cldr_.path() / file) << "<ldml><annotations>" << annotations << "</annotations></ldml>";
+    };
+    write("annotations/en.xml", R"(<annotation cp="❤">love | heart</annotation>
+        <annotation cp="❤" type="tts">red heart</annotation>
+        <annotation cp="👍">+1 | thumbs up</annotation><annotation cp="👍" type="tts">thumbs up</annotation>)");
+    write("annotationsDerived/en.xml", R"(<annotation cp="🏃‍♂">marathon</annotation>)");
+    write("annotations/de.xml", R"(<annotation cp="A">Buchstabe</annotation>)");
+    write("annotationsDerived/de.xml", R"(<annotation cp="🏃‍♂">Marathon</annotation>)");
+    AddUnihanRecords("U+4E01\tkDefinition\tnail\nU+4E01\tkJapaneseOn\tTEI\nU+4E01\tkJapaneseKun\tHINOTO\n"
+                     "U+4E01\tkHangul\t정:0E\nU+4E01\tkKorean\tCENG\nU+4E01\tkMandarin\tdīng zhēng\n"
+                     "U+4E01\tkTotalStrokes\t2 3\nU+4E01\tkCantonese\tding1\nU+4E01\tkCangjie\tMN\n"
+                     "U+4E01\tkRSUnicode\t1.1 1'.2 2.3 3.4 4.5\nU+4E01\tkXHC1983\t0001.010:dīng\n"
+                     "U+4E01\tkFourCornerCode\t1020.0\nU+4E01\tkPhonetic\t1292\nU+ZZZZ\tkMandarin\tbad\n"
+                     "U+4E02\tkMandarin\n# comment\n",
+                     kUnihanFieldsUsed, unihan_);
+  }
+
+  // The rows by character, in database order.
+  std::vector<std::pair<std::string, std::string>> Rows() {
+    const std::optional<CldrAnnotations> english = ReadEnglishCldrAnnotations(cldr_.path());
+    EXPECT_TRUE(english);
+    const UnicodeCharacterTable unicode = ParseUnicodeData(std::string(kUnicodeData) +
+        "2764;HEAVY BLACK HEART;So;0;ON;;;;;N;;;;;\n1F44D;THUMBS UP SIGN;So;0;ON;;;;;N;;;;;\n"
+        "1F692;FIRE ENGINE;So;0;ON;;;;;N;;;;;\n");
+    const auto aliases = ParseNameAliases("0041;ALIAS A;abbreviation\n0041;FIGMENT A;figment\n");
+    // Equal name lengths: fewer code points first (U+FE0F not counted), then file order.
+    const std::vector<EmojiTestEntry> emoji = ParseEmojiTest(
+        "1F3C3 200D 2642 FE0F ; fully-qualified # 🏃‍♂️ E4.0 man running\n"
+        "2764 FE0F ; fully-qualified # ❤️ E0.6 red heart\n"
+        "2764 ; unqualified # ❤ E0.6 red heart\n"
+        "1F44D ; fully-qualified # 👍 E0.6 thumbs up\n"
+        "1F44D 1F3FD ; fully-qualified # 👍🏽 E1.0 thumbs up: medium skin tone\n"
+        "1F692 ; fully-qualified # 🚒 E0.6 fire engine\n");
+    std::vector<std::pair<std::string, std::string>> rows;
+    for (const CharacterRow& row : BuildCharacterRows({unicode, aliases, unihan_, english.value_or(CldrAnnotations{}), emoji})) {
+      rows.emplace_back(row.uchr, row.info);
+    }
+    return rows;
+  }
+
+  testing::ScopedTempDir cldr_;
+  UnihanTable unihan_;
+};
+
+TEST_F(CharacterRowsTest, EachHanFieldComesFromItsOwnUnihanProperty) {
+  const auto built = Rows();
+  const std::map<std::string, std::string> rows(built.begin(), built.end());
+  const struct {
+    const char* tag;
+    const char* value;
+  } kFields[] = {
+      {"unam", "CJK UNIFIED IDEOGRAPH-4E01; nail"},  // derived name; kDefinition
+      {"jyom", "TEI; HINOTO"},                       // kJapaneseOn; kJapaneseKun
+      {"krpi", "정; CENG"},                          // kHangul without its source tag; kKorean
+      {"spin", "dīng"},                              // kMandarin, first value
+      {"swbx", ""},
+      {"swbh", ""},
+      {"sbix", "2"},      // kTotalStrokes, first value
+      {"cbai", "ding1"},  // kCantonese
+      {"tcan", "MN"},     // kCangjie
+      {"tday", ""},
+      {"tpin", "zhēng"},  // kMandarin, second value
+      {"tzhu", "ㄓㄥ"},   // Zhuyin of tpin
+      {"rsu1", "1.1"},    // kRSUnicode, values 1 to 4
+      {"rsu2", "1'.2"},
+      {"rsu3", "2.3"},
+      {"rsu4", "3.4"},
   };
-  EXPECT_EQ(field("jyom"), "SHIN; KOKORO");
-  EXPECT_EQ(field("krpi"), "심; SIM");
-  EXPECT_EQ(field("spin"), "xīn");
-  EXPECT_EQ(field("tpin"), "xīn");
-  EXPECT_EQ(field("tzhu"), "ㄒㄧㄣ");
-  EXPECT_EQ(field("rsu1"), "61.0");
-  EXPECT_EQ(field("rsu2"), "61'.0");
-  EXPECT_EQ(field("rsu3"), "");
-  EXPECT_EQ(field("tday"), "");
+  ASSERT_TRUE(rows.contains("丁"));
+  std::string expected;
+  for (size_t i = 0; i < std::size(kFields); ++i) {
+    EXPECT_EQ(kCharacterInfoFieldTags[i], kFields[i].tag);
+    expected += (i ? "|" : "") + std::string(kFields[i].value);
+  }
+  EXPECT_EQ(rows.at("丁"), expected);
+  EXPECT_EQ(rows.at("丂"), "CJK UNIFIED IDEOGRAPH-4E02|||||||||||||||");  // a Unihan line without value
+}
+
+TEST_F(CharacterRowsTest, NamesGatherEveryEnglishTextAndEmojiComeFirstInSearchOrder) {
+  const std::vector<std::pair<std::string, std::string>> rows = Rows();
+  const std::string empty(15, '|');
+  const std::vector<std::pair<std::string, std::string>> first = {
+      // emoji-test name, the base's Unicode name, English CLDR name and keywords (key without U+FE0F)
+      {"❤️", "red heart; HEAVY BLACK HEART; love; heart" + empty},
+      // a code point: Unicode name, then CLDR; the emoji-test name is not used
+      {"👍", "THUMBS UP SIGN; thumbs up; +1" + empty},
+      {"🚒", "FIRE ENGINE" + empty},
+      {"🏃‍♂️", "man running; marathon" + empty},  // from annotationsDerived/en.xml
+      {std::string(1, '\0'), empty},
+      {"A", "LATIN CAPITAL LETTER A; ALIAS A" + empty},  // no figment, no German
+  };
+  ASSERT_GE(rows.size(), first.size());
+  EXPECT_EQ(std::vector(rows.begin(), rows.begin() + 6), first);
+  // The unqualified ❤ keeps a code-point row; the skin-toned 👍🏽 has none.
+  const std::map<std::string, std::string> by_character(rows.begin(), rows.end());
+  EXPECT_EQ(by_character.at("❤"), "HEAVY BLACK HEART; red heart; love; heart" + empty);
+  EXPECT_FALSE(by_character.contains("👍🏽"));
+  EXPECT_EQ(by_character.size(), rows.size()) << "a character has two rows";
+  EXPECT_EQ(rows.size(), 4u + 15u);  // four emoji, fourteen listed code points and ❤
+}
+
+TEST(HanLanguageInfoTest, NamesTheLanguageOfEveryHanField) {
+  using plist::Array;
+  const plist::Value expected = plist::Dictionary{
+      {"tags", plist::Dictionary{{"jyom", "ja"}, {"krpi", "ko"}, {"spin", "zh-Hans"}, {"swbx", "zh-Hans"},
+                                 {"swbh", "zh-Hans"}, {"sbix", "zh-Hans"}, {"cbai", "yue"}, {"tcan", "zh-Hant"},
+                                 {"tday", "zh-Hant"}, {"tpin", "zh-Hant"}, {"tzhu", "zh-Hant"}, {"rsu1", "zh"},
+                                 {"rsu2", "zh"}, {"rsu3", "zh"}, {"rsu4", "zh"}}},
+      {"languages", plist::Dictionary{{"ja", Array{"jyom"}}, {"ko", Array{"krpi"}},
+                                      {"zh-Hans", Array{"spin", "swbx", "swbh", "sbix"}}, {"yue", Array{"cbai"}},
+                                      {"zh-Hant", Array{"tcan", "tday", "tpin", "tzhu"}},
+                                      {"zh", Array{"rsu1", "rsu2", "rsu3", "rsu4"}}}}};
+  EXPECT_EQ(HanLanguageInfo(), expected);
 }
 
 }  // namespace

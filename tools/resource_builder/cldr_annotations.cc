@@ -2,6 +2,7 @@
 
 #include <pugixml.hpp>
 
+#include "resource_builder/input_files.h"
 #include "resource_builder/ucd_format.h"
 
 namespace lumeris::resources {
@@ -39,6 +40,15 @@ bool AddCldrAnnotations(std::string_view xml_text, CldrAnnotations& annotations)
     }
   }
   return true;
+}
+
+std::optional<CldrAnnotations> ReadEnglishCldrAnnotations(const std::filesystem::path& cldr_dir) {
+  CldrAnnotations english;
+  for (const char* folder : {"annotations", "annotationsDerived"}) {
+    std::optional<std::string> text = ReadTextFile(cldr_dir / folder / "en.xml");
+    if (!text || !AddCldrAnnotations(*text, english)) return std::nullopt;
+  }
+  return english;
 }
 
 }  // namespace lumeris::resources

@@ -9,7 +9,9 @@
 // Thread-safety: plain values; filling is not thread-safe, reading a filled map is.
 #pragma once
 
+#include <filesystem>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -26,5 +28,9 @@ using CldrAnnotations = std::map<std::string, CldrAnnotation, std::less<>>;
 // Adds the annotations of one CLDR annotation file; returns false when the text is not XML.
 // Values that only mark inheritance ("↑↑↑") are skipped; a later file's entries replace earlier ones.
 bool AddCldrAnnotations(std::string_view xml_text, CldrAnnotations& annotations);
+
+// The English annotations under a CLDR "common" folder: annotations/en.xml, then
+// annotationsDerived/en.xml. std::nullopt when either file cannot be read or parsed.
+std::optional<CldrAnnotations> ReadEnglishCldrAnnotations(const std::filesystem::path& cldr_dir);
 
 }  // namespace lumeris::resources

@@ -75,16 +75,6 @@ UnihanTable ReadUnihan(const fs::path& unicode_dir) {
   return unihan;
 }
 
-CldrAnnotations ReadEnglishAnnotations(const fs::path& cldr_dir) {
-  CldrAnnotations english;
-  for (const char* folder : {"annotations", "annotationsDerived"}) {
-    if (!AddCldrAnnotations(Require(cldr_dir / folder / "en.xml"), english)) {
-      throw BuildError{"cannot parse " + (cldr_dir / folder / "en.xml").string()};
-    }
-  }
-  return english;
-}
-
 // Every locale whose own file has character labels, with its texts resolved through its parents.
 std::map<std::string, CldrLocaleTexts> ReadLocaleTexts(const fs::path& cldr_dir) {
   auto parents = ParseCldrParentLocales(Require(cldr_dir / "supplemental" / "supplementalData.xml"));
@@ -149,7 +139,8 @@ std::string Build(const ResourceBuildOptions& options) {
   std::vector<CodePointRange> blocks = ParseCodePointRanges(Require(ucd / "Blocks.txt"));
   std::vector<CodePointRange> scripts = ParseCodePointRanges(Require(ucd / "Scripts.txt"));
   std::vector<EmojiTestEntry> emoji = ParseEmojiTest(Require(ucd / "emoji" / "emoji-test.txt"));
-  CldrAnnotations english = ReadEnglishAnnotations(options.cldr_dir);
+  std::optional<CldrAnnotations> english = ReadEnglishCldrAnnotations(options.cldr_dir);
+  if (!english) throw BuildError{"cannot read the English annotations under " + options.cldr_dir.string()};
   std::map<std::string, CldrLocaleTexts> locales = ReadLocaleTexts(options.cldr_dir);
   std::vector<CategoryDefinition> categories = BuildCategories(unicode, blocks, scripts);
   std::vector<EmojiSubcategory> emoji_subcategories = BuildEmojiSubcategories(emoji);
@@ -173,7 +164,7 @@ std::string Build(const ResourceBuildOptions& options) {
     }
     return related.size();
   });
-  std::vector<CharacterRow> rows = BuildCharacterRows({unicode, aliases, unihan, english, emoji});
+  std::vector<CharacterRow> rows = BuildCharacterRows({unicode, aliases, unihan, *english, emoji});
   if (!WriteCharacterDatabase(app_resources / "CharacterDB.sqlite3", rows)) {
     throw BuildError{"cannot write CharacterDB.sqlite3"};
   }
