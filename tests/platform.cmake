@@ -16,11 +16,6 @@ lumeris_add_gtest(distributed_notifications_test
   LABELS platform dbus
   PRIVATE_BUS)
 
-lumeris_add_gtest(preference_reliability_test
-  SOURCES platform/preference_reliability_test.cc
-  LIBS lumeris_preferences
-  LABELS platform)
-
 lumeris_add_gtest(defaults_command_test
   SOURCES platform/defaults_command_test.cc
   LIBS lumeris_cli_prefs lumeris_preferences lumeris_notifications
