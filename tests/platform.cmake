@@ -12,7 +12,7 @@ lumeris_add_gtest(preference_store_test
 
 lumeris_add_gtest(distributed_notifications_test
   SOURCES platform/distributed_notifications_test.cc
-  LIBS lumeris_notifications lumeris_viewer_names
+  LIBS lumeris_notifications
   LABELS platform dbus
   PRIVATE_BUS)
 
