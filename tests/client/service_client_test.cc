@@ -11,6 +11,7 @@
 #include <fstream>
 #include <future>
 #include <iterator>
+#include <set>
 
 #include "service/listener.h"
 #include "support/service_fixture.h"
@@ -159,58 +160,43 @@ class ClientWithFakeService : public ::testing::Test {
     service_fd_ = fds[1];
   }
   ~ClientWithFakeService() override { close(service_fd_); }
-
-  // The next frame the client sent.
-  Frame Receive() {
-    while (true) {
-      if (std::optional<Frame> frame = decoder_.Next()) return *frame;
-      char buffer[4096];
-      ssize_t n = recv(service_fd_, buffer, sizeof buffer, 0);
-      if (n <= 0) return Frame{};
-      decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
-    }
-  }
-  void Reply(std::uint64_t id, MessageValue body) {
-    std::string bytes = EncodeFrame(Frame{FrameKind::kReply, id, std::move(body)});
+  void SendRaw(const std::string& bytes) {
     ASSERT_EQ(send(service_fd_, bytes.data(), bytes.size(), 0), static_cast<ssize_t>(bytes.size()));
   }
 
   std::unique_ptr<ServiceClient> client_;
   int service_fd_;
-  FrameDecoder decoder_;
 };
 
-TEST_F(ClientWithFakeService, SendsKindsAndFreshIdsAndTimesOutWithoutAReply) {
+TEST_F(ClientWithFakeService, SendsKindsAndFreshIdsAndRepliesReachTheirOwnWaiterOnce) {
   ASSERT_TRUE(client_->Send(Command("add")));
-  std::optional<std::uint64_t> id = client_->SendWantingReply(Command("read"));
-  ASSERT_TRUE(id);
-  Frame first = Receive();
-  Frame second = Receive();
-  EXPECT_EQ(first.kind, FrameKind::kNoReply);
-  EXPECT_EQ(second.kind, FrameKind::kWantsReply);
-  EXPECT_EQ(second.id, *id);
-  EXPECT_NE(first.id, second.id);
-  EXPECT_EQ(*second.body.GetString("command"), "read");
-  EXPECT_FALSE(client_->WaitForReply(*id, 50ms));
-  EXPECT_TRUE(client_->IsOpen());
-}
+  const std::uint64_t a = *client_->SendWantingReply(Command("read"));
+  const std::uint64_t b = *client_->SendWantingReply(Command("read"));
+  FrameDecoder decoder;
+  std::vector<Frame> sent;
+  char buffer[4096];
+  for (ssize_t n; sent.size() < 3 && (n = recv(service_fd_, buffer, sizeof buffer, 0)) > 0;) {
+    decoder.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
+    while (std::optional<Frame> frame = decoder.Next()) sent.push_back(std::move(*frame));
+  }
+  ASSERT_EQ(sent.size(), 3u);
+  EXPECT_EQ(sent[0].kind, FrameKind::kNoReply);
+  EXPECT_EQ(sent[1].kind, FrameKind::kWantsReply);
+  EXPECT_EQ(std::set<std::uint64_t>({sent[0].id, sent[1].id, sent[2].id}).size(), 3u) << "ids are fresh";
+  EXPECT_EQ((std::vector<std::uint64_t>{sent[1].id, sent[2].id}), (std::vector<std::uint64_t>{a, b}));
+  EXPECT_EQ(sent[1].body, Command("read"));
+  EXPECT_FALSE(client_->WaitForReply(a, 50ms));
+  EXPECT_TRUE(client_->IsOpen()) << "a timeout does not end the connection";
 
-TEST_F(ClientWithFakeService, RepliesReachTheirOwnWaiterInAnyOrder) {
-  std::uint64_t a = *client_->SendWantingReply(Command("read"));
-  std::uint64_t b = *client_->SendWantingReply(Command("read"));
-  Reply(b, MessageValue::MakeDictionary({{"n", MessageValue::String("b")}}));
-  Reply(a, MessageValue::MakeDictionary({{"n", MessageValue::String("a")}}));
-  std::optional<MessageValue> reply_a = client_->WaitForReply(a, 2s);
-  std::optional<MessageValue> reply_b = client_->WaitForReply(b, 2s);
-  ASSERT_TRUE(reply_a && reply_b);
-  EXPECT_EQ(*reply_a->GetString("n"), "a");
-  EXPECT_EQ(*reply_b->GetString("n"), "b");
+  SendRaw(EncodeFrame(Frame{FrameKind::kReply, b, Command("b")}) + EncodeFrame(Frame{FrameKind::kReply, a, Command("a")}));
+  EXPECT_EQ(client_->WaitForReply(a, 2s), Command("a"));
+  EXPECT_EQ(client_->WaitForReply(b, 2s), Command("b"));
   EXPECT_FALSE(client_->WaitForReply(a, 10ms)) << "a reply is handed out once";
 }
 
 TEST_F(ClientWithFakeService, MalformedBytesOrAClosedServiceEndTheWaitAtOnce) {
-  std::uint64_t id = *client_->SendWantingReply(Command("read"));
-  ASSERT_EQ(send(service_fd_, "\xc1", 1, 0), 1);
+  const std::uint64_t id = *client_->SendWantingReply(Command("read"));
+  SendRaw("\xc1");
   const auto start = std::chrono::steady_clock::now();
   EXPECT_FALSE(client_->WaitForReply(id, 5s));
   EXPECT_LT(std::chrono::steady_clock::now() - start, 3s);

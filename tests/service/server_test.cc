@@ -2,6 +2,7 @@
 // lifetime, failing handlers, unread replies, and the private runtime directory rule.
 #include "service/server.h"
 
+#include <grp.h>
 #include <sys/stat.h>
 
 #include <condition_variable>
@@ -41,6 +42,7 @@ class InProcessService {
     server_->Start();
   }
   RawConnection Connect() { return std::move(*RawConnection::Open(socket_path_)); }
+  const std::filesystem::path& socket_path() const { return socket_path_; }
   void Stop() { server_->Stop(); }
   // True once `count` connections have been closed, within a few seconds.
   bool WaitForClosed(int count) {
@@ -158,11 +160,39 @@ TEST(ServiceRuntime, UnreadRepliesAreKeptUpTo64MebibytesThenTheConnectionIsClose
   for (int i = 0; i < 8; ++i) ids.push_back(client.SendMessage(Info("x")));
   ids.push_back(client.SendMessage(Info("marker")));
   // One connection's requests run in order: at the marker, eight replies wait unread.
-  ASSERT_EQ(marker.get_future().wait_for(5s), std::future_status::ready);
+  ASSERT_EQ(marker.get_future().wait_for(5s), std::future_status::ready) << "closed with 8 MiB unread";
   for (std::uint64_t id : ids) ASSERT_TRUE(client.ReadReply(id)) << "8 MiB unread closed the connection";
 
   for (int i = 0; i < 80; ++i) client.SendMessage(Info("x"));
   EXPECT_TRUE(service.WaitForClosed(1)) << "80 MiB unread kept the connection";
+}
+
+// A peer of another uid is closed before anything it sends is read; the own user is still served.
+TEST(ServiceRuntime, PeerOfAnotherUidIsRefused) {
+  if (geteuid() != 0) GTEST_SKIP() << "needs root to connect as another uid";
+  ServiceOperations none;
+  InProcessService service(none);
+  // Let uid 65534 reach the socket, so that only the service's own check stands in its way.
+  chmod(service.socket_path().parent_path().c_str(), 0711);
+  chmod(service.socket_path().c_str(), 0666);
+  const std::string request = EncodeFrame(Frame{FrameKind::kWantsReply, 1, Command("search_x")});
+  const pid_t child = fork();  // the child makes system calls only
+  if (child == 0) {
+    if (setgroups(0, nullptr) != 0 || setresgid(65534, 65534, 65534) != 0 || setresuid(65534, 65534, 65534) != 0) _exit(2);
+    const int fd = ConnectUnixSocket(service.socket_path());
+    if (fd < 0) _exit(3);
+    const timeval wait{3, 0};
+    setsockopt(fd, SOL_SOCKET, SO_RCVTIMEO, &wait, sizeof wait);
+    [[maybe_unused]] ssize_t sent = send(fd, request.data(), request.size(), MSG_NOSIGNAL);
+    char reply[64];
+    const ssize_t got = recv(fd, reply, sizeof reply, 0);
+    _exit(got == 0 || (got < 0 && errno == ECONNRESET) ? 0 : 1);
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << "answered or not closed: " << status;
+  RawConnection own = service.Connect();
+  EXPECT_TRUE(own.ReadReply(own.SendMessage(Command("search_x"))));
 }
 
 TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
