@@ -12,14 +12,9 @@ lumeris_add_gtest(preference_store_test
 
 lumeris_add_gtest(distributed_notifications_test
   SOURCES platform/distributed_notifications_test.cc
-  LIBS lumeris_notifications lumeris_viewer_names
+  LIBS lumeris_notifications
   LABELS platform dbus
   PRIVATE_BUS)
-
-lumeris_add_gtest(preference_reliability_test
-  SOURCES platform/preference_reliability_test.cc
-  LIBS lumeris_preferences
-  LABELS platform)
 
 lumeris_add_gtest(defaults_command_test
   SOURCES platform/defaults_command_test.cc

@@ -20,17 +20,12 @@ lumeris_add_gtest(lumeris_service_runtime_test
   LIBS lumeris_service lumeris_service_fixture
   LABELS service)
 
-add_executable(lumeris_service_peer_probe ${CMAKE_CURRENT_LIST_DIR}/service/peer_probe.cc)
-target_link_libraries(lumeris_service_peer_probe PRIVATE lumeris_service_fixture)
-
 lumeris_add_gtest(lumeris_service_e2e_test
   SOURCES ${CMAKE_CURRENT_LIST_DIR}/service/service_e2e_test.cc
   LIBS lumeris_service_fixture
   LABELS service e2e)
 target_compile_definitions(lumeris_service_e2e_test PRIVATE
-  LUMERIS_TEST_PEER_PROBE="$<TARGET_FILE:lumeris_service_peer_probe>"
   LUMERIS_TEST_UNITS_DIR="${PROJECT_BINARY_DIR}/packaging/systemd")
-add_dependencies(lumeris_service_e2e_test lumeris_service_peer_probe)
 
 lumeris_add_gtest(lumeris_client_test
   SOURCES ${CMAKE_CURRENT_LIST_DIR}/client/service_client_test.cc

@@ -9,11 +9,6 @@ lumeris_add_gtest(store_test
 
 lumeris_add_gtest(store_e2e_test
   SOURCES store/store_e2e_test.cc
-  LIBS lumeris_store lumeris_service_fixture lumeris_notifications lumeris_viewer_names
+  LIBS lumeris_store lumeris_service_fixture lumeris_notifications
   LABELS store e2e dbus
   PRIVATE_BUS)
-
-lumeris_add_gtest(large_viewer_e2e_test
-  SOURCES store/large_viewer_e2e_test.cc
-  LIBS lumeris_service_fixture lumeris_preferences lumeris_plist lumeris_store
-  LABELS store e2e)

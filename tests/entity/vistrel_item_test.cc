@@ -15,9 +15,7 @@ using Text = std::optional<icu::UnicodeString>;
 
 const icu::UnicodeString kEmojiFont(u"VantorelColorEmoji");
 
-icu::UnicodeString Current(const char16_t* json) {
-  return icu::UnicodeString(kEntityIDPrefix) + icu::UnicodeString(json);
-}
+icu::UnicodeString Current(const char16_t* json) { return icu::UnicodeString(u"com.vantorel.lmk:") + json; }
 
 // An item; {} stands for an absent value.
 VistrelItem Item(Text entity_id, Text string, Text font, std::optional<uint32_t> glyph) {
@@ -51,8 +49,7 @@ TEST(VistrelItemFromEntityID, SplitsEntityIDsAndWrapsOpaqueStrings) {
       {Current(u"{\"char\":\"A\",\"glyph\":0}"), Item({}, u"A", {}, {})},
       {Current(u"{\"char\":\"A\",\"font\":\"F\",\"glyph\":65541}"), Item({}, u"A", u"F", 5)},
       {Current(u"{\"glyph\":65536}"), Item({}, {}, {}, 0)}, {Current(u"{"), Item({}, {}, {}, {})},
-      {icu::UnicodeString(kOldEntityIDPrefix) + u"<font>F<glyph>7<string>A",
-       Item({}, u"A", u"F", 7)}};
+      {u"com.vantorel.Lumeris:<font>F<glyph>7<string>A", Item({}, u"A", u"F", 7)}};
   ::testing::internal::CaptureStderr();
   for (const auto& c : cases)
     EXPECT_EQ(VistrelItemFromEntityID(c.id), c.item) << ::testing::PrintToString(c.id);
@@ -65,7 +62,7 @@ TEST(VistrelItemFromEntityID, SplitsEntityIDsAndWrapsOpaqueStrings) {
 // IDs whose characters hold the same skin-tone base are one recent when both or neither are in the
 // emoji font, whatever their tones, selectors, glyphs or form; else they compare as text.
 TEST(IsEqualRecentEntityID, SkinTonesOfOneEmojiAreOneRecent) {
-  const icu::UnicodeString prefix(kEntityIDPrefix);
+  const icu::UnicodeString prefix(u"com.vantorel.lmk:");
   const struct { icu::UnicodeString a, b; bool expected; } cases[] = {
       {Emoji({0x1F44D, 0x1F3FD}), Emoji({0x1F44D}), true},
       {Emoji({0x1F44D, 0x1F3FB}), Emoji({0x1F44D, 0x1F3FF}), true},

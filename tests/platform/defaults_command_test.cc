@@ -50,36 +50,24 @@ class DefaultsCommandTest : public ::testing::Test {
 };
 
 TEST_F(DefaultsCommandTest, WriteStoresValueOfTheGivenForm) {
-  struct Case {
-    std::vector<std::string> value_args;
-    Value expected;
-  };
-  const Case cases[] = {
-      {{"123"}, Value(123)},
-      {{"-5"}, Value(-5)},
-      {{"1.5"}, Value(1.5)},
-      {{"true"}, Value(true)},
-      {{"hello world"}, Value("hello world")},
-      {{"\"123\""}, Value("123")},
+  const std::pair<std::vector<std::string>, Value> cases[] = {
+      {{"123"}, Value(123)}, {{"-5"}, Value(-5)}, {{"1.5"}, Value(1.5)}, {{"true"}, Value(true)},
+      {{"hello world"}, Value("hello world")}, {{"\"123\""}, Value("123")},
+      {{"9223372036854775807"}, Value(INT64_MAX)}, {{"-9223372036854775808"}, Value(INT64_MIN)},
       {{"[1,\"a\",[]]"}, Value(plist::Array{1, "a", plist::Array{}})},
       {{"{\"a\":{\"$data\":\"00ff\"},\"b\":{}}"}, Value(plist::Dictionary{{"a", plist::Data{0, 0xff}}, {"b", plist::Dictionary{}}})},
       {{"{\"$date\":\"2001-01-01T00:01:00Z\"}"}, Value(plist::Date{60})},
-      {{"42", "--type", "integer"}, Value(42)},
-      {{"2", "--type", "real"}, Value(2.0)},
-      {{"yes", "--type", "bool"}, Value(true)},
-      {{"0", "--type", "bool"}, Value(false)},
+      {{"9223372036854775807", "--type", "integer"}, Value(INT64_MAX)}, {{"2", "--type", "real"}, Value(2.0)},
+      {{"yes", "--type", "bool"}, Value(true)}, {{"0", "--type", "bool"}, Value(false)},
       {{"0aFF", "--type", "data"}, Value(plist::Data{0x0a, 0xff})},
       {{"2001-01-02T00:00:00.5Z", "--type", "date"}, Value(plist::Date{86400.5})},
       {{"123", "--type", "string"}, Value("123")},
   };
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.value_args[0]);
+  for (const auto& [value_args, expected] : cases) {
     std::vector<std::string> args = {"write", kDomain, "key"};
-    args.insert(args.end(), c.value_args.begin(), c.value_args.end());
-    ASSERT_EQ(Defaults(args), 0) << err_.str();
-    std::optional<Value> stored = Stored("key");
-    ASSERT_TRUE(stored.has_value());
-    EXPECT_TRUE(*stored == c.expected);
+    args.insert(args.end(), value_args.begin(), value_args.end());
+    ASSERT_EQ(Defaults(args), 0) << value_args[0] << ": " << err_.str();
+    EXPECT_EQ(Stored("key"), expected) << value_args[0];
   }
 }
 
@@ -100,9 +88,15 @@ TEST_F(DefaultsCommandTest, ReadPrintsJsonThatWritesBackTheSameValue) {
   EXPECT_EQ(domain["all"]["r"].dump(), "1.0") << "a real must stay a real";
 }
 
-TEST_F(DefaultsCommandTest, DeleteRemovesOneKeyOrTheWholeDomain) {
+// Every command sees the file as it is now: what another writer stored, what a delete removed.
+TEST_F(DefaultsCommandTest, DeleteRemovesOneKeyOrTheWholeDomainAndReadsSeeOtherWriters) {
+  PreferenceStore other;
   ASSERT_EQ(Defaults({"write", kDomain, "a", "1"}), 0);
-  ASSERT_EQ(Defaults({"write", kDomain, "b", "2"}), 0);
+  ASSERT_EQ(Defaults({"read", kDomain, "b"}), 1);  // loads the domain before the other write
+  other.SetValue("b", Value("yes"), kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
+  ASSERT_TRUE(other.Synchronize(kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost));
+  ASSERT_EQ(Defaults({"read", kDomain, "b"}), 0);
+  EXPECT_EQ(out_.str(), "\"yes\"\n");
   ASSERT_EQ(Defaults({"delete", kDomain, "a"}), 0);
   EXPECT_FALSE(Stored("a").has_value());
   EXPECT_TRUE(Stored("b").has_value());
@@ -110,24 +104,12 @@ TEST_F(DefaultsCommandTest, DeleteRemovesOneKeyOrTheWholeDomain) {
   EXPECT_FALSE(Stored("b").has_value());
 }
 
-TEST_F(DefaultsCommandTest, SeesWhatAnotherWriterStored) {
-  PreferenceStore other;
-  other.SetValue("fromService", Value("yes"), kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
-  ASSERT_EQ(Defaults({"read", kDomain, "fromService"}), 1);  // loads the domain before the other write
-  ASSERT_TRUE(other.Synchronize(kDomain, kCFPreferencesCurrentUser, kCFPreferencesAnyHost));
-  ASSERT_EQ(Defaults({"read", kDomain, "fromService"}), 0);
-  EXPECT_EQ(out_.str(), "\"yes\"\n");
-}
-
 // Error paths: nothing is written and the status says why.
 TEST_F(DefaultsCommandTest, BadRequestsFailWithStatusAndWriteNothing) {
-  struct Case {
-    std::vector<std::string> args;
-    int status;
-  };
-  const Case cases[] = {
+  const std::pair<std::vector<std::string>, int> cases[] = {
       {{"write", kDomain, "k", "abc", "--type", "integer"}, 2},
-      {{"write", kDomain, "k", "99999999999999999999", "--type", "integer"}, 2},
+      {{"write", kDomain, "k", "9223372036854775808", "--type", "integer"}, 2},
+      {{"write", kDomain, "k", "9223372036854775808"}, 2},
       {{"write", kDomain, "k", "abc", "--type", "data"}, 2},
       {{"write", kDomain, "k", "maybe", "--type", "bool"}, 2},
       {{"write", kDomain, "k", "yesterday", "--type", "date"}, 2},
@@ -139,59 +121,40 @@ TEST_F(DefaultsCommandTest, BadRequestsFailWithStatusAndWriteNothing) {
       {{"delete", kDomain, "missing"}, 1},
       {{"delete", kDomain}, 1},
   };
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.args[3 < c.args.size() ? 3 : c.args.size() - 1]);
-    EXPECT_EQ(Defaults(c.args), c.status);
-    EXPECT_FALSE(err_.str().empty());
-    EXPECT_FALSE(Stored("k").has_value());
+  for (const auto& [args, status] : cases) {
+    EXPECT_EQ(Defaults(args), status) << args.back();
+    EXPECT_FALSE(err_.str().empty()) << args.back();
+    EXPECT_FALSE(Stored("k").has_value()) << args.back();
   }
   EXPECT_NE(Defaults({"write", kDomain, "k", "1", "--type", "float"}), 0) << "unknown --type accepted";
 }
 
 TEST(PropertyListJsonTest, DatesPrintAsIsoUtcAndParseBack) {
-  struct Case {
-    double seconds;
-    const char* text;
-  };
-  for (const Case& c : {Case{0, "2001-01-01T00:00:00Z"}, Case{-978307200, "1970-01-01T00:00:00Z"},
-                        Case{86400.5, "2001-01-02T00:00:00.5Z"}, Case{725846400, "2024-01-02T00:00:00Z"}}) {
-    SCOPED_TRACE(c.text);
-    EXPECT_EQ(FormatIsoDate({c.seconds}), c.text);
-    std::optional<plist::Date> parsed = ParseIsoDate(c.text);
-    ASSERT_TRUE(parsed.has_value());
-    EXPECT_DOUBLE_EQ(parsed->seconds_since_2001, c.seconds);
+  const std::pair<double, const char*> cases[] = {{0, "2001-01-01T00:00:00Z"}, {-978307200, "1970-01-01T00:00:00Z"},
+                                                  {86400.5, "2001-01-02T00:00:00.5Z"}, {725846400, "2024-01-02T00:00:00Z"}};
+  for (const auto& [seconds, text] : cases) {
+    EXPECT_EQ(FormatIsoDate({seconds}), text);
+    EXPECT_EQ(ParseIsoDate(text).value_or(plist::Date{-1}).seconds_since_2001, seconds) << text;
   }
   for (const char* bad : {"", "2001-01-01", "2001-13-01T00:00:00Z", "2001-01-01T00:00:00", "2001-01-01T00:00:00Zx"}) {
     EXPECT_FALSE(ParseIsoDate(bad).has_value()) << bad;
   }
 }
 
-TEST(WatchCommandTest, PrintsEachNotificationWithLocalTime) {
+TEST(WatchCommandTest, PrintsEachNotificationOfItsNameWithLocalTimeAndFailsWithoutABus) {
   if (std::getenv("DBUS_SESSION_BUS_ADDRESS") == nullptr) GTEST_SKIP() << "no session bus (source scripts/test-env.sh)";
-  std::ostringstream out;
-  std::ostringstream err;
-  WatchRequest request{.name = "WatchTestNotification", .count = 2, .timeout_seconds = 5};
-  const int status = RunWatch(request, out, err, [] {
-    PostDistributedNotification("OtherNotification");
-    PostDistributedNotification("WatchTestNotification");
-    PostDistributedNotification("WatchTestNotification", "obj");
+  std::ostringstream out, err;
+  const int status = RunWatch({.name = "Watched", .count = 2, .timeout_seconds = 5}, out, err, [] {
+    PostDistributedNotification("Other");
+    PostDistributedNotification("Watched");
+    PostDistributedNotification("Watched", "obj");
   });
   EXPECT_EQ(status, 0) << err.str();
-  const std::regex line(R"(\d{4}-\d\d-\d\d \d\d:\d\d:\d\d\.\d{3}  WatchTestNotification(  obj)?\n)");
-  std::istringstream lines(out.str());
-  std::vector<std::string> seen;
-  for (std::string text; std::getline(lines, text);) seen.push_back(text + "\n");
-  ASSERT_EQ(seen.size(), 2u) << out.str();
-  EXPECT_TRUE(std::regex_match(seen[0], line)) << seen[0];
-  EXPECT_TRUE(std::regex_match(seen[1], line)) << seen[1];
-  EXPECT_EQ(seen[1].substr(seen[1].size() - 4), "obj\n");
-}
+  const std::string time = R"(\d{4}-\d\d-\d\d \d\d:\d\d:\d\d\.\d{3}  )";
+  EXPECT_TRUE(std::regex_match(out.str(), std::regex(time + "Watched\n" + time + "Watched  obj\n"))) << out.str();
 
-TEST(WatchCommandTest, NoSessionBusFails) {
   testing::IsolatedUserEnvironment env;
   env.env().Set("DBUS_SESSION_BUS_ADDRESS", "unix:path=" + (env.runtime_dir() / "none").string());
-  std::ostringstream out;
-  std::ostringstream err;
   EXPECT_EQ(RunWatch({.count = 1, .timeout_seconds = 1}, out, err), 1);
   EXPECT_NE(err.str().find("no session bus"), std::string::npos);
 }

@@ -47,14 +47,13 @@ std::vector<std::pair<const char*, Value>> RoundTripCases() {
       {"non_ascii_string", Value("caf\u00e9 \u65e5\u672c \U0001F600")},
       {"zero", Value(0)}, {"small_int", Value(255)}, {"two_byte_int", Value(256)},
       {"four_byte_int", Value(std::int64_t{1} << 31)}, {"large_int", Value(std::int64_t{1} << 40)},
-      {"negative_int", Value(-1)}, {"int64_min", Value(std::numeric_limits<std::int64_t>::min())},
-      {"int64_max", Value(std::numeric_limits<std::int64_t>::max())},
+      {"negative_int", Value(-1)}, {"int64_min", Value(INT64_MIN)}, {"int64_max", Value(INT64_MAX)},
       {"real", Value(0.1)}, {"negative_real", Value(-1.5e300)}, {"true", Value(true)}, {"false", Value(false)},
       {"date", Value(Date{725846400})}, {"date_before_epoch", Value(Date{-86400 * 365})},
       {"empty_data", Value(Data{})}, {"data", Value(Data{0, 1, 0xfe, 0xff, 0x80})},
       {"empty_array", Value(Array{})}, {"empty_dictionary", Value(Dictionary{})},
       {"mixed_array", Value(Array{1, "two", 3.5, true, Data{9}})},
-      {"deep_nesting_within_limit", Nested(kMaxPropertyListDepth - 1)},
+      {"deep_nesting_within_limit", Nested(255)},
       {"nested",
        Value(Dictionary{{"recents", Array{"\U0001F600", "\u2764\uFE0F"}},
                         {"skin", Dictionary{{"\U0001F44D", 3}, {"nested", Dictionary{{"deep", Array{Array{}}}}}}},
@@ -68,10 +67,7 @@ class PropertyListRoundTrip : public ::testing::TestWithParam<Format> {};
 TEST_P(PropertyListRoundTrip, EveryTypeSurvivesUnchanged) {
   for (const auto& [name, value] : RoundTripCases()) {
     SCOPED_TRACE(name);
-    std::optional<Value> back = RoundTrip(value, GetParam());
-    ASSERT_TRUE(back.has_value());
-    EXPECT_EQ(back->type(), value.type());
-    EXPECT_TRUE(*back == value);
+    EXPECT_EQ(RoundTrip(value, GetParam()), value);
   }
 }
 
@@ -101,24 +97,13 @@ TEST(PropertyListIo, BinaryDatesKeepSubSecondPrecisionOnBothSidesOfTheEpoch) {
 
 // A wrong-typed value reads as absent; equality is deep and never converts between types.
 TEST(PropertyListValue, AccessorsAndEqualityAreTypeStrict) {
-  Value integer = 7;
-  EXPECT_TRUE(integer.AsString() == nullptr && integer.AsReal() == nullptr && integer.AsBool() == nullptr);
-  EXPECT_EQ(integer.Find("x"), nullptr);
-  ASSERT_NE(integer.AsInteger(), nullptr);
+  const Value integer = 7;
+  EXPECT_TRUE(integer.AsString() == nullptr && integer.AsReal() == nullptr && integer.Find("x") == nullptr);
   EXPECT_EQ(*integer.AsInteger(), 7);
-  Value text = "1";
-  EXPECT_TRUE(text.AsInteger() == nullptr && text.AsArray() == nullptr && text.AsDictionary() == nullptr);
-
-  EXPECT_FALSE(Value(1) == Value(1.0));
-  EXPECT_FALSE(Value(1) == Value(true));
-  EXPECT_FALSE(Value("1") == Value(1));
-  EXPECT_FALSE(Value(Dictionary{{"a", Array{1, 2}}}) == Value(Dictionary{{"a", Array{2, 1}}}));
-
-  Value dict = Dictionary{{"k", "v"}};
-  EXPECT_EQ(dict.Find("missing"), nullptr);
-  (*dict.AsDictionary())["k"] = 5;
-  ASSERT_NE(dict.Find("k"), nullptr);
-  EXPECT_EQ(*dict.Find("k")->AsInteger(), 5);
+  EXPECT_NE(Value(1), Value(1.0));
+  EXPECT_NE(Value(1), Value(true));
+  EXPECT_NE(Value("1"), Value(1));
+  EXPECT_NE(Value(Dictionary{{"a", Array{1, 2}}}), Value(Dictionary{{"a", Array{2, 1}}}));
 }
 
 TEST(PropertyListIo, ReadsXmlWrittenByOtherTools) {
@@ -134,14 +119,9 @@ TEST(PropertyListIo, ReadsXmlWrittenByOtherTools) {
 </dict>
 </plist>
 )";
-  std::optional<Value> parsed = ParsePropertyList(Bytes(kXml));
-  ASSERT_TRUE(parsed.has_value());
-  Value expected = Dictionary{{"CFBundleIdentifier", "com.vantorel.Sorvendi"},
-                              {"Count", -42},
-                              {"Scale", 2.5},
-                              {"Enabled", true},
-                              {"Blob", Data{0, 1, 2}}};
-  EXPECT_TRUE(*parsed == expected);
+  EXPECT_EQ(ParsePropertyList(Bytes(kXml)), Value(Dictionary{{"CFBundleIdentifier", "com.vantorel.Sorvendi"},
+                                                             {"Count", -42}, {"Scale", 2.5}, {"Enabled", true},
+                                                             {"Blob", Data{0, 1, 2}}}));
 }
 
 TEST(PropertyListIo, ReadsFilesAndMissingOnesReadAsNothing) {
@@ -150,9 +130,7 @@ TEST(PropertyListIo, ReadsFilesAndMissingOnesReadAsNothing) {
   std::vector<std::uint8_t> bytes = SerializeBinaryPropertyList(value);
   std::ofstream(dir.path() / "a.plist", std::ios::binary).write(reinterpret_cast<const char*>(bytes.data()),
                                                               static_cast<std::streamsize>(bytes.size()));
-  std::optional<Value> read = ReadPropertyListFile(dir.path() / "a.plist");
-  ASSERT_TRUE(read.has_value());
-  EXPECT_TRUE(*read == value);
+  EXPECT_EQ(ReadPropertyListFile(dir.path() / "a.plist"), value);
   EXPECT_FALSE(ReadPropertyListFile(dir.path() / "absent.plist").has_value());
   EXPECT_FALSE(ReadPropertyListFile(dir.path()).has_value());
 }
@@ -169,7 +147,7 @@ TEST(PropertyListIoErrors, UnparsableInputReadsAsNothing) {
       {"magic_only", {'b', 'p', 'l', 'i', 's', 't', '0', '0'}},
       {"truncated_binary", truncated},
       {"corrupt_trailer", bad_trailer},
-      {"nesting_beyond_limit", SerializeBinaryPropertyList(Nested(kMaxPropertyListDepth + 1))},
+      {"nesting_beyond_limit", SerializeBinaryPropertyList(Nested(257))},
   };
   for (const auto& [name, bytes] : cases) {
     SCOPED_TRACE(name);

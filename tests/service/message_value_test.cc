@@ -1,5 +1,5 @@
 // MessageValue accessors (wrong-typed values read as absent, writes apply only to their kind) and
-// the list conversions (absent versus empty lists, non-string elements).
+// the conversions of request strings and lists (absent versus empty lists, non-string elements).
 #include "service/message_value.h"
 
 #include <gtest/gtest.h>
@@ -55,17 +55,25 @@ TEST(MessageValue, EqualityDistinguishesKindsWithEqualContent) {
   EXPECT_EQ(MessageValue(), MessageValue::Null());
 }
 
+// Every string the service takes from a request: kept only when it is well-formed UTF-8 without NUL.
+TEST(StringArrayConversions, OnlyWellFormedUtf8WithoutNulConverts) {
+  const std::pair<std::string, bool> cases[] = {
+      {"", true}, {"plain", true}, {"\xF0\x9F\x98\x80", true}, {"\xff\xfe", false}, {std::string("a\0b", 3), false},
+      {"\xED\xA0\x80", false}, {"\xC0\x80", false}, {"\xF0\x9F\x98", false}};
+  for (const auto& [text, converts] : cases) {
+    EXPECT_EQ(ConvertedString(&text), converts ? std::optional(text) : std::nullopt) << ::testing::PrintToString(text);
+  }
+  EXPECT_EQ(ConvertedString(nullptr), std::nullopt);
+}
+
 TEST(StringArrayConversions, EmptyOrAbsentListIsNullAndNonEmptyListsRoundTrip) {
   EXPECT_EQ(CreateXPCArrayFromStringArray(std::nullopt), MessageValue::Null());
   EXPECT_EQ(CreateXPCArrayFromStringArray(Strings{}), MessageValue::Null());
-  const Strings list{"b", "", "com.vantorel.lmk:{\"char\":\"x\"}", "\xff"};
+  const Strings list{"b", "", "com.vantorel.lmk:{\"char\":\"x\"}"};
   MessageValue wire = CreateXPCArrayFromStringArray(list);
-  EXPECT_EQ(wire, MessageValue::MakeArray({MessageValue::String(list[0]),
-                                           MessageValue::String(list[1]),
-                                           MessageValue::String(list[2]),
-                                           MessageValue::String(list[3])}));
-  EXPECT_EQ(StringArrayFromXPCArray(&wire), Strings(list.begin(), list.end() - 1))
-      << "a string that is not UTF-8 does not convert and is skipped";
+  EXPECT_EQ(wire, MessageValue::MakeArray({MessageValue::String(list[0]), MessageValue::String(list[1]),
+                                           MessageValue::String(list[2])}));
+  EXPECT_EQ(StringArrayFromXPCArray(&wire), list);
 }
 
 TEST(StringArrayConversions, AbsentForNonArraysAndEmptyArraysEmptyForNoStrings) {
@@ -77,10 +85,8 @@ TEST(StringArrayConversions, AbsentForNonArraysAndEmptyArraysEmptyForNoStrings) 
       {"string", a, std::nullopt},
       {"dictionary", MessageValue::MakeDictionary({{"a", a}}), std::nullopt},
       {"empty array", MessageValue::MakeArray(), std::nullopt},
-      {"only integers", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::Int64(-1)}),
-       Strings{}},
-      {"strings kept in order",
-       MessageValue::MakeArray({b, MessageValue::Null(), a, MessageValue::MakeArray({a})}),
+      {"only integers", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::Int64(-1)}), Strings{}},
+      {"strings kept in order", MessageValue::MakeArray({b, MessageValue::Null(), a, MessageValue::String("\xff")}),
        Strings{"b", "a"}},
   };
   for (const auto& [name, value, expected] : cases) {

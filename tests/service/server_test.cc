@@ -1,10 +1,11 @@
 // The runtime in-process: per-connection ordering, concurrency between connections, handler
-// lifetime, and the private runtime directory rule.
+// lifetime, failing handlers, unread replies, and the private runtime directory rule.
 #include "service/server.h"
 
+#include <grp.h>
 #include <sys/stat.h>
 
-#include <atomic>
+#include <condition_variable>
 #include <fstream>
 #include <future>
 #include <mutex>
@@ -16,118 +17,182 @@
 namespace lumeris::testing {
 namespace {
 
-// Serves `handler` on a socket in a temporary directory.
+// Serves `operations` on a socket in a temporary directory, counting closed connections.
 class InProcessService {
  public:
-  explicit InProcessService(ConnectionHandler handler) {
+  explicit InProcessService(const ServiceOperations& operations) {
     socket_path_ = dir_.path() / "socket";
     std::optional<ServiceListener> listener = BindServiceSocket(socket_path_);
     EXPECT_TRUE(listener);
-    server_ = std::make_unique<ServiceServer>(listener->fd, std::move(handler), 2);
+    server_ = std::make_unique<ServiceServer>(
+        listener->fd,
+        [this, &operations](const std::shared_ptr<ServiceConnection>& connection) {
+          accepted_ = connection;
+          connection->SetEventHandler([this, connection, &operations](const ConnectionEvent& event) {
+            if (std::holds_alternative<ConnectionClosed>(event)) {
+              std::lock_guard<std::mutex> hold(mutex_);
+              ++closed_;
+              changed_.notify_all();
+            }
+            HandleServiceMessage(*connection, event, operations);
+          });
+          connection->Resume();
+        },
+        2);
     server_->Start();
   }
   RawConnection Connect() { return std::move(*RawConnection::Open(socket_path_)); }
+  const std::filesystem::path& socket_path() const { return socket_path_; }
   void Stop() { server_->Stop(); }
+  // True once `count` connections have been closed, within a few seconds.
+  bool WaitForClosed(int count) {
+    std::unique_lock<std::mutex> hold(mutex_);
+    return changed_.wait_for(hold, 5s, [&] { return closed_ >= count; });
+  }
+  std::weak_ptr<ServiceConnection> accepted_;  // the latest connection
 
  private:
   ScopedTempDir dir_;
   std::filesystem::path socket_path_;
+  std::mutex mutex_;
+  std::condition_variable changed_;
+  int closed_ = 0;
   std::unique_ptr<ServiceServer> server_;
-};
-
-// Character info that blocks on "slow" until released, and records the order of calls.
-struct GatedOperations {
-  GatedOperations() {
-    operations.createXPCDictionaryForCharacterInfo = [this](const std::string& text) {
-      Record("start " + text);
-      if (text == "slow") gate.wait();
-      Record("end " + text);
-      return MessageValue::MakeDictionary({{"for", MessageValue::String(text)}});
-    };
-  }
-  void Record(std::string entry) {
-    std::lock_guard<std::mutex> hold(mutex);
-    log.push_back(std::move(entry));
-  }
-  // Where `entry` stands in the log; read only after the calls have ended.
-  std::ptrdiff_t Position(const std::string& entry) {
-    std::lock_guard<std::mutex> hold(mutex);
-    return std::find(log.begin(), log.end(), entry) - log.begin();
-  }
-
-  ServiceOperations operations;
-  std::promise<void> release;
-  std::shared_future<void> gate = release.get_future().share();
-  std::mutex mutex;
-  std::vector<std::string> log;
 };
 
 MessageValue Info(const char* text) {
   return Command("search_character_info", {{"string", MessageValue::String(text)}});
 }
 
+// Character info that blocks on "slow" until released, and records the order of calls.
 TEST(ServiceRuntime, SlowRequestDelaysItsOwnConnectionButNotAnother) {
-  GatedOperations gated;
-  InProcessService service(MakeServiceConnectionHandler(gated.operations));
+  std::promise<void> release;
+  std::shared_future<void> gate = release.get_future().share();
+  std::mutex mutex;
+  std::vector<std::string> log;
+  auto record = [&](std::string entry) {
+    std::lock_guard<std::mutex> hold(mutex);
+    log.push_back(std::move(entry));
+  };
+  ServiceOperations operations;
+  operations.createXPCDictionaryForCharacterInfo = [&](const std::string& text) {
+    record("start " + text);
+    if (text == "slow") gate.wait();
+    record("end " + text);
+    return MessageValue::MakeDictionary({{"for", MessageValue::String(text)}});
+  };
+  InProcessService service(operations);
   RawConnection slow = service.Connect();
   RawConnection fast = service.Connect();
 
   const std::uint64_t blocked = slow.SendMessage(Info("slow"));
   const std::uint64_t queued = slow.SendMessage(Info("after"));
   // The other connection is answered while the slow request still runs.
-  std::optional<MessageValue> reply = fast.ReadReply(fast.SendMessage(Info("fast")), 5s);
+  std::optional<MessageValue> reply = fast.ReadReply(fast.SendMessage(Info("fast")));
   ASSERT_TRUE(reply);
   EXPECT_EQ(*reply->Find("result")->GetString("for"), "fast");
-  EXPECT_FALSE(slow.ReadFrame(50ms)) << "nothing may come back before the slow request ends";
 
-  gated.release.set_value();
-  std::optional<MessageValue> first = slow.ReadReply(blocked, 5s);
-  std::optional<MessageValue> second = slow.ReadReply(queued, 5s);
+  release.set_value();
+  std::optional<MessageValue> first = slow.ReadReply(blocked);
+  std::optional<MessageValue> second = slow.ReadReply(queued);
   ASSERT_TRUE(first && second);
   EXPECT_EQ(*first->Find("result")->GetString("for"), "slow");
   EXPECT_EQ(*second->Find("result")->GetString("for"), "after");
   // One at a time on a connection: "after" starts only when "slow" has ended.
-  EXPECT_LT(gated.Position("end slow"), gated.Position("start after"));
-  EXPECT_LT(gated.Position("end fast"), gated.Position("end slow"));
+  auto at = [&](const char* entry) { return std::find(log.begin(), log.end(), entry) - log.begin(); };
+  EXPECT_LT(at("end slow"), at("start after"));
+  EXPECT_LT(at("end fast"), at("end slow"));
 }
 
-TEST(ServiceRuntime, HandlerIsReleasedWhenThePeerCloses) {
-  std::promise<std::weak_ptr<ServiceConnection>> accepted;
-  std::atomic<int> closed_events{0};
+TEST(ServiceRuntime, ConnectionIsReleasedWhenThePeerClosesOrTheServerStops) {
   ServiceOperations none;
-  InProcessService service([&](const std::shared_ptr<ServiceConnection>& connection) {
-    accepted.set_value(connection);
-    connection->SetEventHandler([connection, &closed_events, &none](const ConnectionEvent& event) {
-      if (std::holds_alternative<ConnectionClosed>(event)) ++closed_events;
-      HandleServiceMessage(*connection, event, none);
-    });
-    connection->Resume();
-  });
-  std::weak_ptr<ServiceConnection> weak;
+  InProcessService service(none);
   {
     RawConnection client = service.Connect();
-    weak = accepted.get_future().get();
     EXPECT_TRUE(client.ReadReply(client.SendMessage(Command("search_x"))));
-    EXPECT_FALSE(weak.expired());
   }
-  for (int i = 0; i < 500 && !weak.expired(); ++i) std::this_thread::sleep_for(2ms);
-  EXPECT_TRUE(weak.expired()) << "the handler still holds the connection";
-  EXPECT_EQ(closed_events.load(), 1);
-}
+  ASSERT_TRUE(service.WaitForClosed(1));
+  // The handler is dropped right after its ConnectionClosed event, and the connection with it.
+  for (auto deadline = std::chrono::steady_clock::now() + 5s;
+       !service.accepted_.expired() && std::chrono::steady_clock::now() < deadline;) {
+    std::this_thread::yield();
+  }
+  EXPECT_TRUE(service.accepted_.expired()) << "the handler still holds the connection";
 
-TEST(ServiceRuntime, StoppingReleasesOpenConnections) {
-  std::weak_ptr<ServiceConnection> weak;
-  ServiceOperations none;
-  ConnectionHandler base = MakeServiceConnectionHandler(none);
-  InProcessService service([&](const std::shared_ptr<ServiceConnection>& connection) {
-    weak = connection;
-    base(connection);
-  });
   RawConnection client = service.Connect();
   ASSERT_TRUE(client.ReadReply(client.SendMessage(Command("search_x"))));
   service.Stop();
-  EXPECT_TRUE(weak.expired());
+  EXPECT_TRUE(service.accepted_.expired());
   EXPECT_TRUE(client.WaitForPeerClose());
+}
+
+// A handler that throws: its connection is closed and logged, every other one goes on.
+TEST(ServiceRuntime, RequestWhoseHandlerThrowsClosesOnlyItsConnection) {
+  ServiceOperations operations;
+  operations.createXPCDictionaryForCharacterInfo = [](const std::string& text) {
+    if (text == "throw") throw std::runtime_error("no memory");
+    return MessageValue::MakeDictionary();
+  };
+  InProcessService service(operations);
+  RawConnection failing = service.Connect();
+  RawConnection other = service.Connect();
+  ::testing::internal::CaptureStderr();
+  failing.SendMessage(Info("throw"));
+  EXPECT_TRUE(failing.WaitForPeerClose());
+  const std::string log = ::testing::internal::GetCapturedStderr();
+  EXPECT_NE(log.find("closing a connection after a failed request: no memory"), std::string::npos) << log;
+  EXPECT_TRUE(other.ReadReply(other.SendMessage(Info("x"))));
+  RawConnection later = service.Connect();
+  EXPECT_TRUE(later.ReadReply(later.SendMessage(Info("x"))));
+}
+
+// Replies a client does not read are kept up to 64 MiB; beyond that its connection is closed.
+TEST(ServiceRuntime, UnreadRepliesAreKeptUpTo64MebibytesThenTheConnectionIsClosed) {
+  std::promise<void> marker;
+  ServiceOperations operations;
+  operations.createXPCDictionaryForCharacterInfo = [&](const std::string& text) {
+    if (text == "marker") marker.set_value();
+    return MessageValue::MakeDictionary({{"big", MessageValue::String(std::string(1 << 20, 'x'))}});
+  };
+  InProcessService service(operations);
+  RawConnection client = service.Connect();
+  std::vector<std::uint64_t> ids;
+  for (int i = 0; i < 8; ++i) ids.push_back(client.SendMessage(Info("x")));
+  ids.push_back(client.SendMessage(Info("marker")));
+  // One connection's requests run in order: at the marker, eight replies wait unread.
+  ASSERT_EQ(marker.get_future().wait_for(5s), std::future_status::ready) << "closed with 8 MiB unread";
+  for (std::uint64_t id : ids) ASSERT_TRUE(client.ReadReply(id)) << "8 MiB unread closed the connection";
+
+  for (int i = 0; i < 80; ++i) client.SendMessage(Info("x"));
+  EXPECT_TRUE(service.WaitForClosed(1)) << "80 MiB unread kept the connection";
+}
+
+// A peer of another uid is closed before anything it sends is read; the own user is still served.
+TEST(ServiceRuntime, PeerOfAnotherUidIsRefused) {
+  if (geteuid() != 0) GTEST_SKIP() << "needs root to connect as another uid";
+  ServiceOperations none;
+  InProcessService service(none);
+  // Let uid 65534 reach the socket, so that only the service's own check stands in its way.
+  chmod(service.socket_path().parent_path().c_str(), 0711);
+  chmod(service.socket_path().c_str(), 0666);
+  const std::string request = EncodeFrame(Frame{FrameKind::kWantsReply, 1, Command("search_x")});
+  const pid_t child = fork();  // the child makes system calls only
+  if (child == 0) {
+    if (setgroups(0, nullptr) != 0 || setresgid(65534, 65534, 65534) != 0 || setresuid(65534, 65534, 65534) != 0) _exit(2);
+    const int fd = ConnectUnixSocket(service.socket_path());
+    if (fd < 0) _exit(3);
+    const timeval wait{3, 0};
+    setsockopt(fd, SOL_SOCKET, SO_RCVTIMEO, &wait, sizeof wait);
+    [[maybe_unused]] ssize_t sent = send(fd, request.data(), request.size(), MSG_NOSIGNAL);
+    char reply[64];
+    const ssize_t got = recv(fd, reply, sizeof reply, 0);
+    _exit(got == 0 || (got < 0 && errno == ECONNRESET) ? 0 : 1);
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << "answered or not closed: " << status;
+  RawConnection own = service.Connect();
+  EXPECT_TRUE(own.ReadReply(own.SendMessage(Command("search_x"))));
 }
 
 TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
@@ -143,11 +208,8 @@ TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
   std::ofstream(dir.path() / "file") << "x";
   std::filesystem::create_directory(dir.path() / "foreign");
   chmod((dir.path() / "foreign").c_str(), 0700);
-  std::vector<std::pair<std::string, std::string>> refused = {
-      {"open", "0700"}, {"link", ""}, {"file", ""}};
-  if (chown((dir.path() / "foreign").c_str(), 65534, 65534) == 0) {
-    refused.emplace_back("foreign", "another user");
-  }
+  std::vector<std::pair<std::string, std::string>> refused = {{"open", "0700"}, {"link", ""}, {"file", ""}};
+  if (chown((dir.path() / "foreign").c_str(), 65534, 65534) == 0) refused.emplace_back("foreign", "another user");
   for (const auto& [name, reason] : refused) {
     EXPECT_FALSE(EnsurePrivateDirectory(dir.path() / name, &why)) << name;
     EXPECT_NE(why.find(reason), std::string::npos) << name << ": " << why;

@@ -76,6 +76,9 @@ TEST(Wire, IntegerAndFloatFormatsMapToTheirKinds) {
       {"uint16", std::string("\xcd\x01\x00", 3), MessageValue::Uint64(256)},
       {"int8 positive", std::string("\xd0\x05", 2), MessageValue::Uint64(5)},
       {"int64 positive", std::string("\xd3\0\0\0\0\0\0\0\x07", 9), MessageValue::Uint64(7)},
+      {"int64 largest", "\xd3\x7f" + std::string(7, '\xff'), MessageValue::Uint64(INT64_MAX)},
+      {"uint64 largest", "\xcf" + std::string(8, '\xff'), MessageValue::Uint64(UINT64_MAX)},
+      {"int64 smallest", "\xd3\x80" + std::string(7, '\0'), MessageValue::Int64(INT64_MIN)},
       {"negative fixint", "\xff", MessageValue::Int64(-1)},
       {"int16 negative", std::string("\xd1\xff\x00", 3), MessageValue::Int64(-256)},
       {"float32", std::string("\xca\x3f\xc0\x00\x00", 5), MessageValue::Double(1.5)},
@@ -142,12 +145,13 @@ std::string BinFrame(std::size_t payload) {
 
 TEST(WireErrors, FrameOverSixteenMebibytesIsTooBigBeforeItsLastByteArrives) {
   FrameDecoder decoder;
-  decoder.Feed(BinFrame(kMaxFrameBytes).substr(0, kMaxFrameBytes + 1));
+  constexpr std::size_t k16MiB = 16 << 20;
+  decoder.Feed(BinFrame(k16MiB).substr(0, k16MiB + 1));
   EXPECT_FALSE(decoder.Next());
   EXPECT_EQ(decoder.error(), FrameError::kTooBig);
 
-  const std::string fits = BinFrame(kMaxFrameBytes - 11);
-  ASSERT_EQ(fits.size(), kMaxFrameBytes);
+  const std::string fits = BinFrame(k16MiB - 11);
+  ASSERT_EQ(fits.size(), k16MiB);
   FrameDecoder fitting;
   fitting.Feed(fits);
   EXPECT_TRUE(fitting.Next());

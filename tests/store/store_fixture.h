@@ -16,7 +16,6 @@
 #include "platform/preferences_paths.h"
 #include "platform/property_list_io.h"
 #include "store/change_notification.h"
-#include "store/store_keys.h"
 #include "support/scoped_env.h"
 
 namespace lumeris::testing {

@@ -77,18 +77,27 @@ TEST_F(StoreOperationsTest, UnstorablePayloadsWriteNothingAndTextThatIsNotJsonOn
   EXPECT_EQ(posts(), 0);
 }
 
-TEST(JsonPayload, StorableObjectsRoundTripToCompactJsonWithTheirPropertyListTypes) {
+TEST(JsonPayload, StorableObjectsRoundTripToCompactJson) {
   for (const char* text : {R"({})", R"({"a":1,"b":-2,"c":1.5,"d":true,"e":false,"f":"text"})",
+                           R"({"max":9223372036854775807,"min":-9223372036854775808})",
                            R"({"list":[1,"two",[3],{"four":4}],"nested":{"deeper":{"x":"y"}}})",
                            "{\"\xF0\x9F\x91\x8D\":\"\xF0\x9F\x91\x8D\xF0\x9F\x8F\xBD\"}"}) {
     JsonPayload payload = ParseJsonPayload(text);
     ASSERT_EQ(payload.status, Status::kObject) << text;
     EXPECT_EQ(JsonFromDictionary(payload.object), text);
   }
-  JsonPayload payload = ParseJsonPayload(R"( { "int": 3, "real": 2.0, "big": 18446744073709551615, "flag": true } )");
-  ASSERT_EQ(payload.status, Status::kObject);
-  EXPECT_EQ(payload.object, (plist::Dictionary{{"int", std::int64_t{3}}, {"real", 2.0},
-                                               {"big", 18446744073709551615.0}, {"flag", true}}));
+}
+
+// Integers stay integers within the signed 64-bit range and become reals beyond it.
+TEST(JsonPayload, NumbersKeepTheirPropertyListTypes) {
+  const std::pair<const char*, plist::Value> cases[] = {
+      {"3", std::int64_t{3}}, {"2.0", 2.0}, {"9223372036854775807", INT64_MAX}, {"-9223372036854775808", INT64_MIN},
+      {"9223372036854775808", 9223372036854775808.0}, {"18446744073709551615", 18446744073709551615.0},
+      {"18446744073709551616", 18446744073709551616.0}, {"-9223372036854775809", -9223372036854775809.0}};
+  for (const auto& [number, value] : cases) {
+    EXPECT_EQ(ParseJsonPayload(std::string(R"({"n":)") + number + "}").object, (plist::Dictionary{{"n", value}}))
+        << number;
+  }
 }
 
 TEST(JsonPayload, NullsOtherTopLevelsAndNonJsonAreReportedApart) {

@@ -25,52 +25,44 @@ using ::testing::Optional;
 constexpr char kGlobal[] = "VTGlobalEmojiDiversityDescribed";
 constexpr char kDefaultIdentifier[] = "com.vantorel.Lumeris.DefaultDataStorage";
 
+// A domain without a version is wiped (and versioned) by the operations that check it, before
+// they write; any other version is accepted as it is.
 TEST_F(StoreTest, UnversionedDomainIsWipedOnlyByTheOperationsThatCheck) {
   const struct {
     const char* name;
     std::function<void()> operation;
+    std::optional<std::int64_t> version;  // the domain's before
     bool wipes;
+    const char* written;  // a key the operation stores, or ""
   } cases[] = {
-      {"CopyRecents", [] { CopyRecentsIDArray("id"); }, true},
-      {"SetRecents", [] { SetRecentsIDArray(plist::Array{"a"}, "id"); }, true},
-      {"SetFavorites", [] { SetFavoritesIDArray(plist::Array{"a"}, "id"); }, true},
-      {"SetStateAbsent", [] { SetLastState(std::nullopt, "app"); }, true},
-      {"CopyFavorites", [] { CopyFavoritesIDArray("id"); }, false},
-      {"CopySkinTones", [] { CopySkinToneHistory("id"); }, false},
-      {"CopyState", [] { CopyLastState("app"); }, false},
-      {"SetSkinTone", [] { SetLastSkinToneSelection(EmojiID(kThumbsUpMedium), "id"); }, false},
+      {"CopyRecents", [] { CopyRecentsIDArray("id"); }, {}, true, ""},
+      {"SetRecents", [] { SetRecentsIDArray(plist::Array{"a"}, "id"); }, {}, true, "Recents:id"},
+      {"SetFavorites", [] { SetFavoritesIDArray(plist::Array{"a"}, "id"); }, {}, true, "Favorites:id"},
+      {"SetStateAbsent", [] { SetLastState(std::nullopt, "app"); }, {}, true, ""},
+      {"CopyFavorites", [] { CopyFavoritesIDArray("id"); }, {}, false, ""},
+      {"CopySkinTones", [] { CopySkinToneHistory("id"); }, {}, false, ""},
+      {"CopyState", [] { CopyLastState("app"); }, {}, false, ""},
+      {"SetSkinTone", [] { SetLastSkinToneSelection(EmojiID(kThumbsUpMedium), "id"); }, {}, false, "SkinTones:id"},
+      {"SetRecents at version 7", [] { SetRecentsIDArray(plist::Array{"a"}, "id"); }, 7, false, "Recents:id"},
   };
   for (const auto& c : cases) {
     SCOPED_TRACE(c.name);
-    SeedStore({{"Recents:old", plist::Array{"x"}}, {"Leftover", 3}});
+    plist::Dictionary seed{{"Recents:old", plist::Array{"x"}}, {"Leftover", 3}};
+    if (c.version) seed.emplace("version", *c.version);
+    SeedStore(seed);
     CFPreferencesAppSynchronize("com.vantorel.Lumeris");  // the view a fresh process would load
     c.operation();
     // Whatever the operation left pending (a wipe included) reaches the file with the probe.
-    CFPreferencesAppSynchronize("com.vantorel.Lumeris");
     CFPreferencesSetAppValue("Probe", plist::Value(true), "com.vantorel.Lumeris");
     CFPreferencesAppSynchronize("com.vantorel.Lumeris");
     const plist::Dictionary domain = StoredDomain();
     EXPECT_EQ(domain.contains("Leftover"), !c.wipes);
     EXPECT_EQ(domain.contains("Recents:old"), !c.wipes);
+    EXPECT_TRUE(*c.written == '\0' || domain.contains(c.written));
     const auto version = domain.find("version");
-    EXPECT_EQ(version == domain.end() ? std::nullopt : std::optional<plist::Value>(version->second),
-              c.wipes ? std::optional<plist::Value>(std::int64_t{1}) : std::nullopt);
+    EXPECT_EQ(version == domain.end() ? std::nullopt : std::optional(version->second),
+              c.wipes ? std::optional(plist::Value(1)) : c.version ? std::optional(plist::Value(*c.version)) : std::nullopt);
   }
-}
-
-TEST_F(StoreTest, TheWipeHappensOnceAndAnyNonZeroVersionIsAccepted) {
-  SeedStore({{"Old", 1}});
-  SetRecentsIDArray(plist::Array{"a"}, "id");
-  SetFavoritesIDArray(plist::Array{"f"}, "id");
-  EXPECT_THAT(StoredList("Recents:id"), Optional(ElementsAre("a")));
-  EXPECT_THAT(StoredList("Favorites:id"), Optional(ElementsAre("f")));
-  EXPECT_FALSE(StoredDomain().contains("Old"));
-
-  SeedStore({{"version", 7}, {"Keep", 1}});
-  CheckDataStorageVersion();
-  SetRecentsIDArray(plist::Array{"a"}, "id");
-  EXPECT_TRUE(StoredDomain().contains("Keep"));
-  EXPECT_EQ(StoredDomain().at("version"), plist::Value(std::int64_t{7}));
 }
 
 // ---- Recents ----
@@ -95,6 +87,7 @@ TEST_F(RecentsTest, AddingPutsTheItemFirstRemovingEntriesOfTheSameTextAndNotifie
       {"emoji font and plain stay apart", plist::Array{PlainID(kThumbsUp)}, up, {up, PlainID(kThumbsUp)}},
       {"the first item again", plist::Array{a, b}, a, {a, b}},
       {"over a value that is not a list", plist::Value("not a list"), "token", {"token"}},
+      {"never trimmed", plist::Array(200, plist::Value(a)), b, [&] { StringVector v(201, a); v[0] = b; return v; }()},
   };
   for (const auto& t : cases) {
     SCOPED_TRACE(t.name);
@@ -104,15 +97,6 @@ TEST_F(RecentsTest, AddingPutsTheItemFirstRemovingEntriesOfTheSameTextAndNotifie
     EXPECT_EQ(StoredList("Recents:id"), t.expected);
     EXPECT_EQ(posts(), 1);
   }
-}
-
-TEST_F(RecentsTest, AddingNeverTrims) {
-  for (int n = 0; n < 150; ++n) AddRecentID(PlainID(std::to_string(n)), "id");
-  const std::optional<StringVector> list = StoredList("Recents:id");
-  ASSERT_TRUE(list);
-  ASSERT_EQ(list->size(), 150u);
-  EXPECT_EQ(list->front(), PlainID("149"));
-  EXPECT_EQ(list->back(), PlainID("0"));
 }
 
 TEST_F(RecentsTest, EveryStoreNotifiesOnceAndKeepsTheHistoryInStepWithTheList) {
@@ -198,20 +182,23 @@ plist::Array OldItems(const StringVector& characters) {
   return items;
 }
 
+// Older items become entity IDs; elements of other types become empty items.
 TEST_F(StoreTest, TheDefaultIdentifierConvertsOlderRecentsOnceAndOthersNever) {
   SeedDomain("com.vantorel.SorvendiIM",
              {{"VTRecentItems", plist::Array{plist::Dictionary{{"EntityID", "kept-as-is"}},
-                                             plist::Dictionary{{"String", "A"}, {"Font", "Courier"}}}},
+                                             plist::Dictionary{{"String", "A"}, {"Font", "Courier"}}, "text",
+                                             plist::Dictionary{{"String", 5}, {"Glyph", 12}, {"Font", "F"}}}},
               {"VTFavorites", OldItems({"F"})}});
+  const auto converted = ElementsAre("kept-as-is", PlainID("A"), "com.vantorel.lmk:{}",
+                                     "com.vantorel.lmk:{\"font\":\"F\",\"glyph\":12}");
   EXPECT_FALSE(CopyRecentsIDArray("other"));
   EXPECT_FALSE(CopyFavoritesIDArray("other"));
   EXPECT_FALSE(StoredValue("VTRecentsConverted"));
   EXPECT_FALSE(StoredValue("VTFavoritesConverted"));
 
   const std::string key = "Recents:com.vantorel.Lumeris.DefaultDataStorage";
-  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultIdentifier)),
-              Optional(ElementsAre("kept-as-is", PlainID("A"))));
-  EXPECT_THAT(StoredList(key), Optional(ElementsAre("kept-as-is", PlainID("A"))));
+  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultIdentifier)), Optional(converted));
+  EXPECT_THAT(StoredList(key), Optional(converted));
   EXPECT_EQ(StoredValue("VTRecentsConverted"), plist::Value(true));
   EXPECT_EQ(posts(), 1);
   SetRecentsIDArray(std::nullopt, kDefaultIdentifier);
@@ -245,14 +232,6 @@ TEST_F(StoreTest, WithNoOlderListsTheConversionIsTriedOnce) {
   SeedDomain("com.vantorel.SorvendiIM", {{"VTRecentItems", OldItems({"A"})}, {"VTFavorites", OldItems({"F"})}});
   EXPECT_FALSE(CopyFavoritesIDArray(kDefaultIdentifier));
   EXPECT_FALSE(CopyRecentsIDArray(kDefaultIdentifier));
-}
-
-TEST_F(StoreTest, OlderElementsOfOtherTypesConvertToEmptyItems) {
-  SeedStore({{"version", 1}});
-  SeedDomain("com.vantorel.SorvendiIM",
-             {{"VTRecentItems", plist::Array{"text", plist::Dictionary{{"String", 5}, {"Glyph", 12}, {"Font", "F"}}}}});
-  EXPECT_THAT(StringsOf(CopyRecentsIDArray(kDefaultIdentifier)),
-              Optional(ElementsAre("com.vantorel.lmk:{}", "com.vantorel.lmk:{\"font\":\"F\",\"glyph\":12}")));
 }
 
 // ---- The skin-tone history ----

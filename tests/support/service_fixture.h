@@ -214,19 +214,6 @@ class ServiceTest : public ::testing::Test {
     return connection.ReadReply(connection.SendMessage(request), timeout);
   }
 
-  // Sends `request` wanting a reply, then a probe that is always answered. One connection's
-  // messages are handled in order, so the first reply must be the probe's: no waiting for
-  // something not to happen.
-  void expectNoReply(const MessageValue& request) {
-    RawConnection connection = Connect();
-    connection.SendMessage(request);
-    const std::uint64_t probe =
-        connection.SendMessage(MessageValue::MakeDictionary({{"command", MessageValue::String("search_probe")}}));
-    std::optional<Frame> frame = connection.ReadFrame(10s);
-    ASSERT_TRUE(frame) << "no reply to the probe sent after " << request;
-    EXPECT_EQ(frame->id, probe) << "unexpected reply " << frame->body << " to " << request;
-  }
-
   IsolatedUserEnvironment environment_;
   std::filesystem::path socket_path_;
   ServiceProcess service_;
