@@ -2,6 +2,7 @@
 
 #include <CLI/CLI.hpp>
 #include <gdkmm/frameclock.h>
+#include <glibmm/main.h>
 #include <gtkmm/application.h>
 
 #include <chrono>
@@ -9,7 +10,6 @@
 #include <memory>
 
 #include "picker/picker_window.h"
-#include "platform/font_coverage.h"
 
 namespace lumeris::picker {
 namespace {
@@ -33,10 +33,12 @@ void ReportStartup(PickerWindow& window, std::chrono::steady_clock::time_point s
                      &started);
   });
   window.signal_updated().connect([&window] {
-    if (!window.loaded()) return;
+    static bool reported = false;
+    if (reported || !window.loaded()) return;
+    reported = true;
     std::printf("ready %.1f\n", MillisecondsSince(started));
     std::fflush(stdout);
-    window.close();
+    Glib::signal_idle().connect_once([&window] { window.close(); });
   });
 }
 
@@ -52,7 +54,6 @@ int RunPickerApplication(int argc, char** argv) {
   cli.add_flag("--report-startup", report_startup, "print startup times and quit once ready");
   CLI11_PARSE(cli, argc, argv);
 
-  LoadLumerisFontConfiguration();
   auto app = Gtk::Application::create("com.vantorel.LumerisPicker", Gio::Application::Flags::NON_UNIQUE);
   std::unique_ptr<PickerWindow> window;
   app->signal_activate().connect([&] {

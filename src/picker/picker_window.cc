@@ -179,6 +179,9 @@ void PickerWindow::BuildHeader() {
   signal_close_request().connect(
       [this] {
         SaveState();
+        // The widgets go with the window: replies still on their way are dropped.
+        alive_.reset();
+        if (observer_) observer_->Stop();
         return false;
       },
       false);
@@ -261,6 +264,9 @@ void PickerWindow::LoadUserData() {
 void PickerWindow::LoadCategories() {
   // The category names come from the bundle's "Categories" list, read off the main thread.
   glyph_checks_->Post([this, post = PosterFor(alive_)] {
+    // The emoji test and the glyph checks need the project's font configuration; loading it
+    // here keeps it off the way to the first frame.
+    LoadLumerisFontConfiguration();
     std::vector<std::string> names;
     if (const std::optional<Bundle> application = OpenApplicationBundle()) {
       for (const CategoryGroup& group :
@@ -307,7 +313,8 @@ void PickerWindow::ApplyState(const PickerState& state) {
 }
 
 void PickerWindow::SaveState() {
-  if (!user_data_loaded_) return;  // nothing read yet: do not overwrite the stored state
+  // Nothing read yet (do not overwrite the stored state), or already saved on closing.
+  if (!user_data_loaded_ || !alive_) return;
   state_.category = last_section_;
   state_.window_width = get_width() > 0 ? get_width() : state_.window_width;
   state_.window_height = get_height() > 0 ? get_height() : state_.window_height;
