@@ -8,3 +8,8 @@ lumeris_add_gtest(lumeris_picker_test
 target_include_directories(lumeris_picker_test PRIVATE ${CMAKE_CURRENT_LIST_DIR}/picker)
 target_compile_definitions(lumeris_picker_test PRIVATE
   LUMERIS_TEST_PICTURES="${CMAKE_BINARY_DIR}/test-pictures")
+
+lumeris_add_gtest(lumeris_picker_model_test
+  SOURCES ${CMAKE_CURRENT_LIST_DIR}/picker/picker_model_test.cc
+  LIBS lumeris_picker_model lumeris
+  LABELS picker)
