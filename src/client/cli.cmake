@@ -3,21 +3,23 @@
 # carries another name.
 add_library(lumeris_cli STATIC
   ${CMAKE_CURRENT_LIST_DIR}/cli_app.cc
-  ${CMAKE_CURRENT_LIST_DIR}/cli_base64.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_channel.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_items.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_json_value.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_output.cc
   ${CMAKE_CURRENT_LIST_DIR}/cli_session.cc
+  ${CMAKE_CURRENT_LIST_DIR}/cli_suggestion.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/category_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/demo_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/raw_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/search_commands.cc
+  ${CMAKE_CURRENT_LIST_DIR}/commands/status_command.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/store_commands.cc
   ${CMAKE_CURRENT_LIST_DIR}/commands/viewer_command.cc)
 target_link_libraries(lumeris_cli
-  PUBLIC lumeris_client lumeris_config lumeris_plist CLI11::CLI11 nlohmann_json::nlohmann_json
-  PRIVATE lumeris lumeris_cli_prefs lumeris_preferences lumeris_categories lumeris_data_notation ICU::uc)  # lumeris_cli_prefs: the defaults and watch subcommands
+  PUBLIC lumeris_client lumeris_cli_prefs lumeris_config lumeris_plist CLI11::CLI11 nlohmann_json::nlohmann_json
+  PRIVATE lumeris lumeris_preferences lumeris_store lumeris_categories lumeris_system_root lumeris_data_notation
+          ICU::uc)
 
 add_executable(lumeris_cli_program ${CMAKE_CURRENT_LIST_DIR}/main.cc)
 target_link_libraries(lumeris_cli_program PRIVATE lumeris_cli)
