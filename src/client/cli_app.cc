@@ -98,14 +98,16 @@ std::string UnknownSubcommand(const CLI::App& app, int argc, const char* const* 
 }  // namespace
 
 void BuildCliApp(CLI::App& app, CliSession& session) {
-  app.description("The Lumeris file service from a shell: one subcommand per request.");
+  app.description(
+      "The Lumeris file service from a shell: one subcommand per request. It connects to the "
+      "service's socket and starts lumeris-fileservice when nothing listens there.");
   app.set_version_flag("--version", lumeris::config::kVersion, "print the version and exit");
   app.set_help_flag("--help,-h", "print this help (or a subcommand's) and exit");
   app.add_flag("--json", session.settings().json, "print machine-readable JSON (one line) instead of text for people");
   app.add_option("--timeout", session.settings().timeout_seconds, "seconds to wait for a reply before giving up")
       ->capture_default_str()
       ->type_name("SECONDS")
-      ->check(CLI::Validator(CheckTimeout, "SECONDS", "positive seconds"));
+      ->check(CLI::Validator(CheckTimeout, "", "positive seconds"));
   // Global options may also follow the subcommand.
   app.fallthrough();
   app.require_subcommand(1);

@@ -76,11 +76,11 @@ constexpr CharacterQuery kCharacterQueries[] = {
      "Characters whose name contains TEXT, with code points and names", "text",
      "the text to look for in character names", true, "lumeris search 'smiling face' --limit 5",
      &FormatFoundCharacters, "(none)"},
-    {"related", "search_related_chars", "Characters related to CHAR, with code points and names",
+    {"related", "search_related_chars", "Characters related to CHARACTER, with code points and names",
      "character", "the character", true, "lumeris related 中 --limit 10", &FormatFoundCharacters,
      "(none)"},
     {"info", "search_character_info",
-     "The sixteen information fields of CHAR, in field order, with what each holds", "character",
+     "The sixteen information fields of CHARACTER, in field order, with what each holds", "character",
      "the character", false, "lumeris info 中", &FormatInformation,
      "(none)"},
 };
