@@ -50,10 +50,7 @@ TEST(FormatListsTest, CharactersAndItemsOneLineEach) {
             "😀\tU+1F600\nA\tU+0041\tLATIN CAPITAL LETTER A\n");
   EXPECT_EQ(ShortCharacterName("one two three four five six seven; x"),
             "one two three four five six ...");
-  const MessageValue null;
-  EXPECT_EQ(FormatCharacters(&null), "");
-  EXPECT_EQ(FormatCharacters(nullptr), "");
-  EXPECT_EQ(FormatItems(&null), "");
+  EXPECT_EQ(FormatItems(nullptr), "");
 }
 
 TEST(FormatCharacterInfoTest, PrintsTheSixteenTagsInFieldOrderThenOtherKeys) {
