@@ -1,9 +1,12 @@
 #!/usr/bin/env bash
-# scripts/build.sh [release|asan] — configures (once) and builds one build tree under build/.
-# The build also runs the resource builder, which writes the bundles under build/<kind>/root.
+# scripts/build.sh [release|asan] [TARGET...] — configures (once) and builds one build tree under
+# build/: everything, or only the targets named (./run names the programs, the library and the
+# bundle). The full build also runs the resource builder, which writes the bundles under
+# build/<kind>/root.
 set -euo pipefail
 top=$(cd "$(dirname "$0")/.." && pwd)
 kind=${1:-release}
+shift || true
 dir="$top/build/$kind"
 case "$kind" in
   release) flags=(-DCMAKE_BUILD_TYPE=RelWithDebInfo) ;;
@@ -13,4 +16,8 @@ esac
 if [[ ! -f "$dir/build.ninja" ]]; then
   cmake -S "$top" -B "$dir" -G Ninja "${flags[@]}" >/dev/null
 fi
-cmake --build "$dir"
+if [[ $# -gt 0 ]]; then
+  cmake --build "$dir" --target "$@"
+else
+  cmake --build "$dir"
+fi

@@ -20,8 +20,10 @@ namespace lumeris::cli {
 // must outlive `app`.
 void BuildCliApp(CLI::App& app, CliSession& session);
 
-// Parses and runs one command line against `channel`; returns the exit status (help and usage
-// errors included, printed as CLI11 prints them).
+// Parses and runs one command line against `channel`; returns the exit status (kExitStatusText):
+// help and version print to `out` and give 0; a usage error prints "lumeris: <problem>" (with
+// the nearest subcommand for an unknown one) and a hint to `err` and gives 2, before anything
+// is sent.
 int RunCli(int argc, const char* const* argv, ServiceChannel& channel, std::ostream& out,
            std::ostream& err);
 

@@ -2,10 +2,17 @@
 
 #include <sstream>
 
+#include "platform/preference_store.h"
 #include "platform/preferences_paths.h"
 #include "platform/property_list_io.h"
 
 namespace lumeris::cli {
+namespace {
+
+// The user data store's preference domain.
+constexpr char kStoreDomainName[] = "com.vantorel.Lumeris";
+
+}  // namespace
 
 ClientServiceChannel::ClientServiceChannel(ServiceClientOptions options)
     : options_(std::move(options)) {}
@@ -30,9 +37,8 @@ std::optional<MessageValue> ClientServiceChannel::Request(const MessageValue& re
   }
   std::optional<MessageValue> reply = client->WaitForReply(*id, timeout);
   if (!reply && error) {
-    *error = client->IsOpen()
-                 ? "no reply from the file service within " + DescribeTimeout(timeout)
-                 : "the file service closed the connection without replying";
+    *error = client->IsOpen() ? "no reply from the file service within " + DescribeTimeout(timeout)
+                              : client->CloseReason();
   }
   return reply;
 }
@@ -57,7 +63,7 @@ bool ClientServiceChannel::Send(const MessageValue& request, std::chrono::millis
 
 std::optional<StoreFileSnapshot> ClientServiceChannel::SnapshotStoreFile() {
   std::optional<std::filesystem::path> path =
-      PreferencesFilePath("com.vantorel.Lumeris", kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
+      PreferencesFilePath(kStoreDomainName, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
   if (!path) return std::nullopt;
   StoreFileSnapshot snapshot{*path, plist::Dictionary(), {}};
   std::error_code error;
@@ -73,6 +79,14 @@ std::optional<StoreFileSnapshot> ClientServiceChannel::SnapshotStoreFile() {
     if (name.compare(0, prefix.size(), prefix) == 0) snapshot.corrupt_copies.insert(std::move(name));
   }
   return snapshot;
+}
+
+bool ClientServiceChannel::RemoveStoreKey(const std::string& key, std::string* error) {
+  PreferenceStore& store = PreferenceStore::Shared();
+  store.SetValue(key, std::nullopt, kStoreDomainName, kCFPreferencesCurrentUser, kCFPreferencesAnyHost);
+  if (store.Synchronize(kStoreDomainName, kCFPreferencesCurrentUser, kCFPreferencesAnyHost)) return true;
+  if (error) *error = "cannot write the preferences of " + std::string(kStoreDomainName);
+  return false;
 }
 
 std::string DescribeTimeout(std::chrono::milliseconds timeout) {

@@ -50,6 +50,10 @@ class ServiceChannel {
   // service confirmed reached the disk; std::nullopt when the channel cannot see the service's
   // files (then nothing is checked).
   virtual std::optional<StoreFileSnapshot> SnapshotStoreFile() { return std::nullopt; }
+
+  // Removes `key` from the store domain's file directly (for what no request can remove), under
+  // the same lock and synchronisation as the service. False with the reason in `*error`.
+  virtual bool RemoveStoreKey(const std::string& key, std::string* error) = 0;
 };
 
 // The channel over one ServiceClient connection, made on first use (starting the service on
@@ -67,6 +71,7 @@ class ClientServiceChannel : public ServiceChannel {
             std::string* error) override;
   // Reads the file the service uses: the same XDG paths, as the service runs as the same user.
   std::optional<StoreFileSnapshot> SnapshotStoreFile() override;
+  bool RemoveStoreKey(const std::string& key, std::string* error) override;
 
  private:
   // The connection, connecting first when needed; nullptr with the reason in `*error`.

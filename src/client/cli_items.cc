@@ -2,6 +2,8 @@
 
 #include <cstdio>
 
+#include <nlohmann/json.hpp>
+
 #include "entity/entity_id.h"
 #include "text/emoji.h"
 #include "text/utf8.h"
@@ -12,6 +14,20 @@ bool IsEntityID(std::string_view text) {
   const std::string current = EncodeUtf8Lenient(icu::UnicodeString(kEntityIDPrefix));
   const std::string old = EncodeUtf8Lenient(icu::UnicodeString(kOldEntityIDPrefix));
   return text.starts_with(current) || text.starts_with(old);
+}
+
+std::optional<std::string> ItemProblem(std::string_view item) {
+  if (item.empty()) return "an item is a character or an entity ID, not empty text";
+  const std::string current = EncodeUtf8Lenient(icu::UnicodeString(kEntityIDPrefix));
+  if (!item.starts_with(current)) return std::nullopt;
+  const nlohmann::json json = nlohmann::json::parse(item.substr(current.size()), nullptr, /*allow_exceptions=*/false);
+  if (json.is_object()) return std::nullopt;
+  return "\"" + std::string(item) + "\" is not a valid entity ID: after \"" + current +
+         "\" comes a JSON object such as {\"char\":\"A\"}";
+}
+
+bool TakesSkinTone(std::string_view character) {
+  return ContainedDiversityUnicode(DecodeUtf8Lenient(character)) != 0;
 }
 
 std::string EntityIDForItem(std::string_view item, const ItemOptions& options) {

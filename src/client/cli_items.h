@@ -29,6 +29,14 @@ struct ItemOptions {
 // True when `text` begins with the current or the old entity-ID prefix.
 bool IsEntityID(std::string_view text);
 
+// Why the service could not use `item` as typed: empty, or an entity ID whose current-form JSON
+// is not an object; std::nullopt when it is usable.
+std::optional<std::string> ItemProblem(std::string_view item);
+
+// True when `character` is an emoji whose skin tone the service remembers (a skin-tone base,
+// alone or with one modifier).
+bool TakesSkinTone(std::string_view character);
+
 // `item` as an entity ID: an entity ID is returned as it is; anything else is taken as the
 // character and written in the current form with the font and glyph of `options` (--font wins
 // over --emoji-font).

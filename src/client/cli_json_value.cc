@@ -1,19 +1,9 @@
 #include "client/cli_json_value.h"
 
-#include <charconv>
-#include <cmath>
-#include <limits>
-
-#include "client/cli_base64.h"
+#include "client/json_notation.h"
 
 namespace lumeris::cli {
 namespace {
-
-constexpr std::string_view kUint64Escape = "$uint64";
-constexpr std::string_view kInt64Escape = "$int64";
-constexpr std::string_view kDoubleEscape = "$double";
-constexpr std::string_view kDataEscape = "$data";
-constexpr std::string_view kDictionaryEscape = "$dictionary";
 
 // Deeper nesting than this is refused rather than risking the stack.
 constexpr int kMaxDepth = 1000;
@@ -22,7 +12,7 @@ using Json = nlohmann::json;
 
 class Converter {
  public:
-  explicit Converter(std::string* error) : error_(error) {}
+  Converter(std::string* error, std::string* note) : error_(error), note_(note) {}
 
   std::optional<MessageValue> Convert(const Json& json, const std::string& path, int depth) {
     if (depth > kMaxDepth) return Fail(path, "nested too deeply");
@@ -42,16 +32,15 @@ class Converter {
       case Json::value_t::array: {
         MessageValue array = MessageValue::MakeArray();
         for (std::size_t i = 0; i < json.size(); ++i) {
-          std::optional<MessageValue> element =
-              Convert(json[i], path + "/" + std::to_string(i), depth + 1);
+          std::optional<MessageValue> element = Convert(json[i], path + "/" + std::to_string(i), depth + 1);
           if (!element) return std::nullopt;
           array.Append(std::move(*element));
         }
         return array;
       }
       case Json::value_t::object:
-        if (json.size() == 1 && json.begin().key().starts_with("$")) {
-          return ConvertEscape(json.begin().key(), json.begin().value(), path, depth);
+        if (const std::string_view tag = TagOf(json); !tag.empty()) {
+          return ConvertTagged(tag, json.begin().value(), path + "/" + std::string(tag), depth);
         }
         return ConvertMembers(json, path, depth);
       default:
@@ -60,8 +49,7 @@ class Converter {
   }
 
  private:
-  std::optional<MessageValue> ConvertMembers(const Json& object, const std::string& path,
-                                             int depth) {
+  std::optional<MessageValue> ConvertMembers(const Json& object, const std::string& path, int depth) {
     MessageValue dictionary = MessageValue::MakeDictionary();
     for (const auto& [key, member] : object.items()) {
       std::optional<MessageValue> value = Convert(member, path + "/" + key, depth + 1);
@@ -71,89 +59,55 @@ class Converter {
     return dictionary;
   }
 
-  std::optional<MessageValue> ConvertEscape(const std::string& key, const Json& value,
-                                            const std::string& path, int depth) {
-    const std::string where = path + "/" + key;
-    if (key == kUint64Escape) {
-      if (value.is_number_unsigned()) return MessageValue::Uint64(value.get<std::uint64_t>());
-      std::uint64_t number = 0;
-      if (value.is_string() && ParseDecimal(value.get_ref<const std::string&>(), number)) {
-        return MessageValue::Uint64(number);
-      }
+  std::optional<MessageValue> ConvertTagged(std::string_view tag, const Json& value, const std::string& where,
+                                            int depth) {
+    if (tag == kUint64Tag) {
+      if (auto number = Uint64FromTag(value)) return MessageValue::Uint64(*number);
       return Fail(where, "expects decimal text of an unsigned 64-bit integer");
     }
-    if (key == kInt64Escape) {
-      if (value.is_number_integer() &&
-          (!value.is_number_unsigned() ||
-           value.get<std::uint64_t>() <= std::uint64_t{std::numeric_limits<std::int64_t>::max()})) {
-        return MessageValue::Int64(value.get<std::int64_t>());
-      }
-      std::int64_t number = 0;
-      if (value.is_string() && ParseDecimal(value.get_ref<const std::string&>(), number)) {
-        return MessageValue::Int64(number);
-      }
+    if (tag == kInt64Tag) {
+      if (auto number = Int64FromTag(value)) return MessageValue::Int64(*number);
       return Fail(where, "expects decimal text of a signed 64-bit integer");
     }
-    if (key == kDoubleEscape) {
-      if (value.is_number()) return MessageValue::Double(value.get<double>());
-      if (value.is_string()) {
-        const std::string& text = value.get_ref<const std::string&>();
-        if (text == "nan") return MessageValue::Double(std::numeric_limits<double>::quiet_NaN());
-        if (text == "inf") return MessageValue::Double(std::numeric_limits<double>::infinity());
-        if (text == "-inf") return MessageValue::Double(-std::numeric_limits<double>::infinity());
-      }
+    if (tag == kDoubleTag) {
+      if (auto number = DoubleFromTag(value)) return MessageValue::Double(*number);
       return Fail(where, "expects a number, \"nan\", \"inf\" or \"-inf\"");
     }
-    if (key == kDataEscape) {
-      if (value.is_string()) {
-        if (auto bytes = DecodeBase64(value.get_ref<const std::string&>())) {
-          return MessageValue::Data(std::move(*bytes));
-        }
-      }
-      return Fail(where, "expects padded base64 text");
+    if (IsBytesTag(tag)) {
+      std::string reason;
+      if (auto bytes = BytesFromTag(tag, value, &reason, note_)) return MessageValue::Data(std::move(*bytes));
+      return Fail(where, reason);
     }
-    if (key == kDictionaryEscape) {
+    if (tag == kDictionaryTag) {
       if (value.is_object()) return ConvertMembers(value, where, depth + 1);
       return Fail(where, "expects a JSON object");
     }
-    return Fail(where, "is not a known escape ($uint64, $int64, $double, $data, $dictionary); "
-                       "wrap a literal dictionary in {\"$dictionary\": ...}");
-  }
-
-  template <typename Integer>
-  static bool ParseDecimal(const std::string& text, Integer& number) {
-    const char* end = text.data() + text.size();
-    auto [stop, status] = std::from_chars(text.data(), end, number);
-    return status == std::errc() && stop == end && !text.empty();
+    if (tag == kDateTag) return Fail(where, "a date has no message form");
+    return Fail(where, UnknownTagReason());
   }
 
   std::optional<MessageValue> Fail(const std::string& path, std::string_view reason) {
-    if (error_) *error_ = (path.empty() ? std::string("the value") : path) + " " + std::string(reason);
+    if (error_) *error_ = DescribePointer(path) + " " + std::string(reason);
     return std::nullopt;
   }
 
   std::string* error_;
+  std::string* note_;
 };
-
-Json Escape(std::string_view key, Json value) {
-  Json object = Json::object();
-  object[std::string(key)] = std::move(value);
-  return object;
-}
 
 }  // namespace
 
-std::optional<MessageValue> MessageValueFromJson(const nlohmann::json& json, std::string* error) {
-  return Converter(error).Convert(json, "", 0);
+std::optional<MessageValue> MessageValueFromJson(const nlohmann::json& json, std::string* error, std::string* note) {
+  return Converter(error, note).Convert(json, "", 0);
 }
 
-std::optional<MessageValue> MessageValueFromJsonText(std::string_view text, std::string* error) {
+std::optional<MessageValue> MessageValueFromJsonText(std::string_view text, std::string* error, std::string* note) {
   Json json = Json::parse(text, nullptr, /*allow_exceptions=*/false);
   if (json.is_discarded()) {
     if (error) *error = "not valid JSON: " + std::string(text);
     return std::nullopt;
   }
-  return MessageValueFromJson(json, error);
+  return MessageValueFromJson(json, error, note);
 }
 
 nlohmann::json JsonFromMessageValue(const MessageValue& value) {
@@ -168,34 +122,24 @@ nlohmann::json JsonFromMessageValue(const MessageValue& value) {
       // A JSON integer that is not negative reads back as a uint64.
       const std::int64_t number = *value.AsInt64();
       if (number < 0) return number;
-      return Escape(kInt64Escape, std::to_string(number));
+      return Tagged(kInt64Tag, std::to_string(number));
     }
-    case MessageValue::Kind::kDouble: {
-      const double number = *value.AsDouble();
-      if (std::isnan(number)) return Escape(kDoubleEscape, "nan");
-      if (std::isinf(number)) return Escape(kDoubleEscape, number > 0 ? "inf" : "-inf");
-      return number;
-    }
+    case MessageValue::Kind::kDouble:
+      return DoubleJson(*value.AsDouble());
     case MessageValue::Kind::kString:
       return *value.AsString();
     case MessageValue::Kind::kData:
-      return Escape(kDataEscape, EncodeBase64(*value.AsData()));
+      return BytesJson(*value.AsData());
     case MessageValue::Kind::kArray: {
       Json array = Json::array();
-      for (const MessageValue& element : *value.AsArray()) {
-        array.push_back(JsonFromMessageValue(element));
-      }
+      for (const MessageValue& element : *value.AsArray()) array.push_back(JsonFromMessageValue(element));
       return array;
     }
     case MessageValue::Kind::kDictionary: {
       Json object = Json::object();
-      for (const auto& [key, member] : *value.AsDictionary()) {
-        object[key] = JsonFromMessageValue(member);
-      }
-      // A lone key beginning with "$" would read back as an escape.
-      if (object.size() == 1 && object.begin().key().starts_with("$")) {
-        return Escape(kDictionaryEscape, std::move(object));
-      }
+      for (const auto& [key, member] : *value.AsDictionary()) object[key] = JsonFromMessageValue(member);
+      // A lone key beginning with "$" would read back as a tag.
+      if (!TagOf(object).empty()) return Tagged(kDictionaryTag, std::move(object));
       return object;
     }
   }
@@ -203,8 +147,7 @@ nlohmann::json JsonFromMessageValue(const MessageValue& value) {
 }
 
 std::string JsonText(const nlohmann::json& json, bool pretty) {
-  return json.dump(pretty ? 2 : -1, ' ', /*ensure_ascii=*/false,
-                   nlohmann::json::error_handler_t::replace);
+  return json.dump(pretty ? 2 : -1, ' ', /*ensure_ascii=*/false, nlohmann::json::error_handler_t::replace);
 }
 
 }  // namespace lumeris::cli

@@ -11,6 +11,7 @@
 #include <cstring>
 
 #include "client/cli_json_value.h"
+#include "service/wire.h"
 
 namespace lumeris::cli {
 
@@ -23,8 +24,20 @@ std::optional<MessageValue> CliSession::Ask(std::string_view what, const Message
   return Ask(what, request, timeout(), /*quiet=*/false);
 }
 
+namespace {
+
+// Ends the command when `request` cannot travel as one message.
+void CheckFitsOneMessage(CliSession& session, std::string_view what, const MessageValue& request) {
+  const std::size_t size = EncodeFrame(Frame{FrameKind::kWantsReply, 0, request}).size();
+  if (size <= kMaxFrameBytes) return;
+  session.Refuse(what, "the request is " + std::to_string(size) + " bytes, over the 16 MiB one message may hold");
+}
+
+}  // namespace
+
 std::optional<MessageValue> CliSession::Ask(std::string_view what, const MessageValue& request,
                                             std::chrono::milliseconds timeout, bool quiet) {
+  CheckFitsOneMessage(*this, what, request);
   std::string error;
   std::optional<MessageValue> reply = channel_.Request(request, timeout, &error);
   if (!reply && !quiet) Complain(std::string(what) + ": " + error);
@@ -32,6 +45,7 @@ std::optional<MessageValue> CliSession::Ask(std::string_view what, const Message
 }
 
 bool CliSession::Tell(std::string_view what, const MessageValue& request) {
+  CheckFitsOneMessage(*this, what, request);
   std::string error;
   if (channel_.Send(request, timeout(), &error)) return true;
   Complain(std::string(what) + ": " + error);
@@ -57,7 +71,7 @@ std::string LikelyWriteObstacle(const std::filesystem::path& file) {
 
 int CliSession::TellStored(std::string_view what, const MessageValue& request, const StoredCheck& check) {
   const std::optional<StoreFileSnapshot> before = channel_.SnapshotStoreFile();
-  if (!Tell(what, request)) return kExitNoAnswer;
+  if (!Tell(what, request)) return kExitFailure;
   const std::optional<StoreFileSnapshot> after = channel_.SnapshotStoreFile();
   if (!after) return 0;
   for (const std::string& copy : after->corrupt_copies) {
@@ -73,10 +87,15 @@ int CliSession::TellStored(std::string_view what, const MessageValue& request, c
   if (after->content && check.holds(found)) return 0;
   Complain(std::string(what) + ": not stored in " + after->path.string() + ": " +
            LikelyWriteObstacle(after->path));
-  return kExitNotStored;
+  return kExitFailure;
 }
 
 void CliSession::Complain(std::string_view message) { err_ << "lumeris: " << message << '\n'; }
+
+void CliSession::Refuse(std::string_view what, std::string_view reason) {
+  Complain(std::string(what) + ": " + std::string(reason));
+  ExitWith(kExitUsage);
+}
 
 void CliSession::PrintJson(const nlohmann::json& json) { out_ << JsonText(json, false) << '\n'; }
 

@@ -1,12 +1,13 @@
 // CliSession: what every `lumeris` subcommand shares while one command line runs: the channel
 // to the service, the output streams and the global options (--json, --timeout). Commands call
 // Ask() for requests that answer and Tell() for those that never do; both report a failure to
-// the error stream once, in one sentence, and the command then ends with a non-zero status.
+// the error stream once, in one sentence ("lumeris: <what>: <reason>"), and the command then
+// ends with a non-zero status.
 //
-// Exit statuses of `lumeris`: 0 success; 1 the service could not be reached or did not answer in
-// time; 2 an argument the command cannot use (bad JSON, an unknown escape, text that is not
-// valid UTF-8 or holds NUL); 3 the service handled a write but the preference file does not
-// hold it (see TellStored); CLI11's own codes for malformed command lines.
+// Exit statuses of `lumeris` (every subcommand): 0 done; 1 the command could not be carried
+// out (the service unreachable or silent, a write the preference file does not hold, a missing
+// key); 2 a usage error (an unknown subcommand or option, an argument the command cannot use),
+// refused before anything is sent.
 //
 // Thread-safety: one session per command line, used by one thread.
 #pragma once
@@ -25,9 +26,17 @@
 
 namespace lumeris::cli {
 
-inline constexpr int kExitNoAnswer = 1;
-inline constexpr int kExitBadArgument = 2;
-inline constexpr int kExitNotStored = 3;
+inline constexpr int kExitFailure = 1;
+inline constexpr int kExitUsage = 2;
+
+// The exit statuses as `lumeris --help` and the manual page state them.
+inline constexpr char kExitStatusText[] =
+    "Exit status:\n"
+    "  0  done\n"
+    "  1  not done: the service could not be reached or did not answer in time, a write did not\n"
+    "     reach the preference file, a key or domain is missing (the message says which)\n"
+    "  2  usage error: an unknown subcommand or option, or an argument the command cannot use\n"
+    "     (nothing was sent)\n";
 
 inline constexpr char kDefaultIdentifier[] = "com.vantorel.Lumeris.DefaultDataStorage";
 inline constexpr char kDefaultApplication[] = "com.vantorel.lumeris-cli";
@@ -43,6 +52,7 @@ class CliSession {
       : channel_(channel), out_(out), err_(err) {}
 
   CliSettings& settings() { return settings_; }
+  ServiceChannel& channel() { return channel_; }
   bool json() const { return settings_.json; }
   std::ostream& out() { return out_; }
   std::ostream& err() { return err_; }
@@ -50,7 +60,8 @@ class CliSession {
   // --timeout as a duration (at least 1 ms).
   std::chrono::milliseconds timeout() const;
 
-  // The reply to `request`, or std::nullopt after printing "lumeris: <what>: <reason>".
+  // The reply to `request`, or std::nullopt after printing "lumeris: <what>: <reason>". A request
+  // too big for one message ends the command with kExitUsage before anything is sent.
   std::optional<MessageValue> Ask(std::string_view what, const MessageValue& request);
   // The same with an explicit timeout and, when `quiet`, without printing.
   std::optional<MessageValue> Ask(std::string_view what, const MessageValue& request,
@@ -65,14 +76,16 @@ class CliSession {
     std::string key;
     std::function<bool(const plist::Value* found)> holds;
   };
-  // Tell(), then reads the preference file back (when the channel can see it): kExitNoAnswer
-  // when Tell() failed; kExitNotStored, after printing the file and the likely reason, when the
-  // file does not hold what `check` expects; else 0. Warns on the error stream when the
+  // Tell(), then reads the preference file back (when the channel can see it): kExitFailure
+  // when Tell() failed, or, after printing "<what>: not stored in <file>: <likely reason>", when
+  // the file does not hold what `check` expects; else 0. Warns on the error stream when the
   // service moved an unparsable file aside meanwhile.
   int TellStored(std::string_view what, const MessageValue& request, const StoredCheck& check);
 
   // Prints "lumeris: <message>" to the error stream.
   void Complain(std::string_view message);
+  // Complain()s "<what>: <reason>" and ends the command with kExitUsage.
+  [[noreturn]] void Refuse(std::string_view what, std::string_view reason);
   // Prints `json` on one line to the output stream.
   void PrintJson(const nlohmann::json& json);
   // Prints `lines` (whole lines), or `when_empty` and a newline when there are none.

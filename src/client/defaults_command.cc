@@ -10,9 +10,8 @@
 namespace lumeris::cli {
 namespace {
 
-constexpr int kMissing = 1;
+constexpr int kFailed = 1;
 constexpr int kBadValue = 2;
-constexpr int kNotWritten = 3;
 
 std::optional<plist::Value> ParseTypedValue(const std::string& text, const std::string& type) {
   if (type == "string") return plist::Value(text);
@@ -45,11 +44,23 @@ std::optional<plist::Value> ParseTypedValue(const std::string& text, const std::
   return std::nullopt;
 }
 
-std::optional<plist::Value> ParseValue(const std::string& text, const std::optional<std::string>& type) {
-  if (type) return ParseTypedValue(text, *type);
+// VALUE as --type or the JSON notation says; std::nullopt with the reason in `*error`.
+std::optional<plist::Value> ParseValue(const std::string& text, const std::optional<std::string>& type,
+                                       std::string* error, std::string* note) {
+  if (type) {
+    std::optional<plist::Value> value = ParseTypedValue(text, *type);
+    if (!value) *error = "\"" + text + "\" is not " + (*type == "integer" ? "an " : "a ") + *type + " value";
+    return value;
+  }
   nlohmann::json json = nlohmann::json::parse(text, nullptr, /*allow_exceptions=*/false);
   if (json.is_discarded()) return plist::Value(text);
-  return PropertyListFromJson(json);
+  std::optional<plist::Value> value = PropertyListFromJson(json, error, note);
+  if (!value) *error = "\"" + text + "\": " + *error;
+  return value;
+}
+
+std::string JsonOutput(const plist::Value& value, bool one_line) {
+  return PropertyListToJson(value).dump(one_line ? -1 : 2, ' ', false, nlohmann::json::error_handler_t::replace);
 }
 
 }  // namespace
@@ -58,7 +69,7 @@ int RunDefaults(const DefaultsRequest& request, std::ostream& out, std::ostream&
   PreferenceStore& store = PreferenceStore::Shared();
   const PreferencesHost host = request.current_host ? kCFPreferencesCurrentHost : kCFPreferencesAnyHost;
   if (!PreferencesFilePath(request.domain, kCFPreferencesCurrentUser, host)) {
-    err << "lumeris defaults: \"" << request.domain << "\" is not a usable domain name\n";
+    err << "lumeris: defaults: \"" << request.domain << "\" is not a usable domain name\n";
     return kBadValue;
   }
   store.Synchronize(request.domain, kCFPreferencesCurrentUser, host);
@@ -66,28 +77,35 @@ int RunDefaults(const DefaultsRequest& request, std::ostream& out, std::ostream&
   switch (request.action) {
     case DefaultsRequest::Action::kRead: {
       if (!request.key) {
-        out << PropertyListToJson(store.CopyDomain(request.domain, kCFPreferencesCurrentUser, host)).dump(2) << "\n";
+        plist::Dictionary domain = store.CopyDomain(request.domain, kCFPreferencesCurrentUser, host);
+        if (domain.empty()) {
+          err << "lumeris: defaults: domain \"" << request.domain << "\" is empty\n";
+          return kFailed;
+        }
+        out << JsonOutput(plist::Value(std::move(domain)), request.json) << "\n";
         return 0;
       }
       std::optional<plist::Value> value = store.CopyValue(*request.key, request.domain, kCFPreferencesCurrentUser, host);
       if (!value) {
-        err << "lumeris defaults: no key \"" << *request.key << "\" in domain \"" << request.domain << "\"\n";
-        return kMissing;
+        err << "lumeris: defaults: no key \"" << *request.key << "\" in domain \"" << request.domain << "\"\n";
+        return kFailed;
       }
-      out << PropertyListToJson(*value).dump(2) << "\n";
+      out << JsonOutput(*value, request.json) << "\n";
       return 0;
     }
     case DefaultsRequest::Action::kWrite: {
       if (!request.key || !request.value) {
-        err << "lumeris defaults: write needs a key and a value\n";
+        err << "lumeris: defaults: write needs a key and a value\n";
         return kBadValue;
       }
-      std::optional<plist::Value> value = ParseValue(*request.value, request.type);
+      std::string error;
+      std::string note;
+      std::optional<plist::Value> value = ParseValue(*request.value, request.type, &error, &note);
       if (!value) {
-        err << "lumeris defaults: \"" << *request.value << "\" is not a valid "
-            << (request.type ? *request.type : std::string("JSON")) << " value\n";
+        err << "lumeris: defaults: " << error << "\n";
         return kBadValue;
       }
+      if (!note.empty()) err << "lumeris: defaults: warning: " << note << "\n";
       store.SetValue(*request.key, std::move(value), request.domain, kCFPreferencesCurrentUser, host);
       break;
     }
@@ -95,15 +113,15 @@ int RunDefaults(const DefaultsRequest& request, std::ostream& out, std::ostream&
       std::vector<std::string> keys;
       if (request.key) {
         if (!store.CopyValue(*request.key, request.domain, kCFPreferencesCurrentUser, host)) {
-          err << "lumeris defaults: no key \"" << *request.key << "\" in domain \"" << request.domain << "\"\n";
-          return kMissing;
+          err << "lumeris: defaults: no key \"" << *request.key << "\" in domain \"" << request.domain << "\"\n";
+          return kFailed;
         }
         keys.push_back(*request.key);
       } else {
         keys = store.CopyKeyList(request.domain, kCFPreferencesCurrentUser, host);
         if (keys.empty()) {
-          err << "lumeris defaults: domain \"" << request.domain << "\" is empty\n";
-          return kMissing;
+          err << "lumeris: defaults: domain \"" << request.domain << "\" is empty\n";
+          return kFailed;
         }
       }
       for (const std::string& key : keys) store.SetValue(key, std::nullopt, request.domain, kCFPreferencesCurrentUser, host);
@@ -111,26 +129,32 @@ int RunDefaults(const DefaultsRequest& request, std::ostream& out, std::ostream&
     }
   }
   if (!store.Synchronize(request.domain, kCFPreferencesCurrentUser, host)) {
-    err << "lumeris defaults: could not write the preferences of \"" << request.domain << "\"\n";
-    return kNotWritten;
+    err << "lumeris: defaults: could not write the preferences of \"" << request.domain << "\"\n";
+    return kFailed;
   }
   return 0;
 }
 
-CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err) {
-  CLI::App* defaults = app.add_subcommand("defaults", "Read and write the preference store");
+CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err, const bool* json) {
+  CLI::App* defaults = app.add_subcommand("defaults", "Read and write the preference store directly");
   defaults->require_subcommand(1);
   auto request = std::make_shared<DefaultsRequest>();
-  defaults->add_flag("--current-host", request->current_host, "Use the host-specific preference file");
+  defaults->add_flag("--current-host", request->current_host, "use the host-specific preference file");
+  defaults->footer(
+      "Examples:\n"
+      "  lumeris defaults read com.vantorel.Lumeris\n"
+      "  lumeris defaults write com.vantorel.Lumeris version 1 --type integer");
 
-  auto run = [request, &out, &err] {
+  auto run = [request, &out, &err, json] {
+    request->json = json != nullptr && *json;
     const int status = RunDefaults(*request, out, err);
     if (status != 0) throw CLI::RuntimeError(status);
   };
 
   CLI::App* read = defaults->add_subcommand("read", "Print a domain, or one key of it, as JSON");
-  read->add_option("domain", request->domain, "Preference domain")->required();
-  read->add_option("key", request->key, "Key (the whole domain when omitted)");
+  read->add_option("domain", request->domain, "preference domain")->required();
+  read->add_option("key", request->key, "key (the whole domain when omitted)");
+  read->footer("Example: lumeris defaults read com.vantorel.SorvendiIM VTStartAsLargeWindowTemporarily");
   read->callback([request, run] {
     request->action = DefaultsRequest::Action::kRead;
     run();
@@ -139,11 +163,15 @@ CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err
   CLI::App* write = defaults->add_subcommand(
       "write",
       "Set a key. VALUE is JSON (text that is not JSON is stored as a string); data is "
-      "{\"$data\":\"<hex>\"} and a date {\"$date\":\"2024-05-01T12:00:00Z\"}. With --type, VALUE "
-      "is plain text of that type.");
-  write->add_option("domain", request->domain, "Preference domain")->required();
-  write->add_option("key", request->key, "Key")->required();
-  write->add_option("value", request->value, "Value")->required();
+      "{\"$base64\":\"AP8=\"} or {\"$hex\":\"00ff\"}, a date {\"$date\":\"2024-05-01T12:00:00Z\"}. "
+      "With --type, VALUE is plain text of that type.");
+  write->add_option("domain", request->domain, "preference domain")->required();
+  write->add_option("key", request->key, "key")->required();
+  write->add_option("value", request->value, "value")->required();
+  write->footer(
+      "Examples:\n"
+      "  lumeris defaults write com.vantorel.Lumeris 'Favorites:com.vantorel.Lumeris.DefaultDataStorage' '[\"a\"]'\n"
+      "  lumeris defaults write com.example blob '{\"$hex\":\"00ff\"}'");
   write->add_option("--type", request->type,
                     "integer (123), real (1.5), bool (true/false/yes/no/1/0), string, data (hex "
                     "digits), date (ISO 8601 UTC)")
@@ -154,8 +182,9 @@ CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err
   });
 
   CLI::App* remove = defaults->add_subcommand("delete", "Remove a key, or every key of a domain");
-  remove->add_option("domain", request->domain, "Preference domain")->required();
-  remove->add_option("key", request->key, "Key (every key when omitted)");
+  remove->add_option("domain", request->domain, "preference domain")->required();
+  remove->add_option("key", request->key, "key (every key when omitted)");
+  remove->footer("Example: lumeris defaults delete com.example.app");
   remove->callback([request, run] {
     request->action = DefaultsRequest::Action::kDelete;
     run();

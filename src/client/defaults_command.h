@@ -9,10 +9,13 @@
 //   lumeris defaults delete DOMAIN [KEY]      one key, or every key of the domain
 //   --current-host                            the host-specific file (ByHost) instead
 //
-// JSON forms of data and dates are described in client/property_list_json.h; with --type,
+// VALUE is in the tagged JSON notation of client/json_notation.h (data {"$base64": ...} or
+// {"$hex": ...}, a date {"$date": ...}), so everything `read` prints writes back; with --type,
 // VALUE is plain text: an integer, a real, true/false/yes/no/1/0, hex digits, or an ISO 8601
-// UTC date. Results go to `out`, messages to `err`; the exit status is 0 on success, 1 for a
-// missing key or domain, 2 for a value that does not convert, 3 when the store cannot be written.
+// UTC date. `read` prints indented JSON, one line with --json. Results go to `out`, messages
+// ("lumeris: defaults: ...") to `err`; the exit status is 0 on success, 1 for a missing key, an
+// empty domain or a store that cannot be written, 2 for a value or domain name that does not
+// convert.
 //
 // Thread-safety: RunDefaults may run on any thread; the registered command writes to the
 // streams given at registration, which must outlive the parse.
@@ -34,6 +37,7 @@ struct DefaultsRequest {
   std::optional<std::string> value;  // kWrite only
   std::optional<std::string> type;   // kWrite only: integer, real, bool, string, data, date
   bool current_host = false;
+  bool json = false;  // read: one line instead of indented
 };
 
 // Runs one request; returns the exit status.
@@ -41,6 +45,7 @@ int RunDefaults(const DefaultsRequest& request, std::ostream& out, std::ostream&
 
 // Adds the "defaults" subcommand (with read, write, delete) to `app`. When it is parsed the
 // request runs; a non-zero status is reported as CLI::RuntimeError(status), as CLI11 expects.
-CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err);
+// `json`, when given, is the program's --json flag (read at run time).
+CLI::App* AddDefaultsCommand(CLI::App& app, std::ostream& out, std::ostream& err, const bool* json = nullptr);
 
 }  // namespace lumeris::cli

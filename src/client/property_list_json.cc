@@ -4,44 +4,17 @@
 #include <cstdio>
 #include <ctime>
 
+#include "client/cli_base64.h"
+#include "client/json_notation.h"
+
 namespace lumeris::cli {
 namespace {
 
 constexpr double kUnixSecondsAt2001 = 978307200;
-constexpr char kDataTag[] = "$data";
-constexpr char kDateTag[] = "$date";
-
-std::string ToHex(const plist::Data& data) {
-  static constexpr char kDigits[] = "0123456789abcdef";
-  std::string hex;
-  hex.reserve(data.size() * 2);
-  for (std::uint8_t byte : data) {
-    hex.push_back(kDigits[byte >> 4]);
-    hex.push_back(kDigits[byte & 0xf]);
-  }
-  return hex;
-}
-
-int HexDigit(char c) {
-  if (c >= '0' && c <= '9') return c - '0';
-  if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-  if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-  return -1;
-}
 
 }  // namespace
 
-std::optional<plist::Data> ParseHex(std::string_view hex) {
-  if (hex.size() % 2 != 0) return std::nullopt;
-  plist::Data data;
-  for (std::size_t i = 0; i < hex.size(); i += 2) {
-    const int high = HexDigit(hex[i]);
-    const int low = HexDigit(hex[i + 1]);
-    if (high < 0 || low < 0) return std::nullopt;
-    data.push_back(static_cast<std::uint8_t>(high * 16 + low));
-  }
-  return data;
-}
+std::optional<plist::Data> ParseHex(std::string_view hex) { return DecodeHex(hex); }
 
 std::optional<plist::Date> ParseIsoDate(std::string_view text) {
   int year = 0, month = 0, day = 0, hour = 0, minute = 0, consumed = 0;
@@ -90,13 +63,13 @@ nlohmann::json PropertyListToJson(const plist::Value& value) {
     case plist::Value::Type::kInteger:
       return *value.AsInteger();
     case plist::Value::Type::kReal:
-      return *value.AsReal();
+      return DoubleJson(*value.AsReal());
     case plist::Value::Type::kBool:
       return *value.AsBool();
     case plist::Value::Type::kDate:
-      return nlohmann::json{{kDateTag, FormatIsoDate(*value.AsDate())}};
+      return Tagged(kDateTag, FormatIsoDate(*value.AsDate()));
     case plist::Value::Type::kData:
-      return nlohmann::json{{kDataTag, ToHex(*value.AsData())}};
+      return BytesJson(*value.AsData());
     case plist::Value::Type::kArray: {
       nlohmann::json array = nlohmann::json::array();
       for (const plist::Value& item : *value.AsArray()) array.push_back(PropertyListToJson(item));
@@ -105,60 +78,119 @@ nlohmann::json PropertyListToJson(const plist::Value& value) {
     case plist::Value::Type::kDictionary: {
       nlohmann::json object = nlohmann::json::object();
       for (const auto& [key, item] : *value.AsDictionary()) object[key] = PropertyListToJson(item);
+      // A lone key beginning with "$" would read back as a tag.
+      if (!TagOf(object).empty()) return Tagged(kDictionaryTag, std::move(object));
       return object;
     }
   }
   return nullptr;
 }
 
-std::optional<plist::Value> PropertyListFromJson(const nlohmann::json& json) {
-  switch (json.type()) {
-    case nlohmann::json::value_t::string:
-      return plist::Value(json.get<std::string>());
-    case nlohmann::json::value_t::number_integer:
-      return plist::Value(json.get<std::int64_t>());
-    case nlohmann::json::value_t::number_unsigned: {
-      const auto unsigned_value = json.get<std::uint64_t>();
-      if (unsigned_value > static_cast<std::uint64_t>(INT64_MAX)) return std::nullopt;
-      return plist::Value(static_cast<std::int64_t>(unsigned_value));
-    }
-    case nlohmann::json::value_t::number_float:
-      return plist::Value(json.get<double>());
-    case nlohmann::json::value_t::boolean:
-      return plist::Value(json.get<bool>());
-    case nlohmann::json::value_t::array: {
-      plist::Array array;
-      for (const nlohmann::json& item : json) {
-        std::optional<plist::Value> converted = PropertyListFromJson(item);
-        if (!converted) return std::nullopt;
-        array.push_back(std::move(*converted));
-      }
-      return plist::Value(std::move(array));
-    }
-    case nlohmann::json::value_t::object: {
-      if (json.size() == 1 && json.begin()->is_string()) {
-        const std::string& tag = json.begin().key();
-        const std::string text = json.begin()->get<std::string>();
-        if (tag == kDataTag) {
-          std::optional<plist::Data> data = ParseHex(text);
-          return data ? std::optional<plist::Value>(plist::Value(std::move(*data))) : std::nullopt;
+namespace {
+
+// Deeper nesting than this is refused rather than risking the stack.
+constexpr int kMaxDepth = 1000;
+
+class PropertyListReader {
+ public:
+  PropertyListReader(std::string* error, std::string* note) : error_(error), note_(note) {}
+
+  std::optional<plist::Value> Read(const nlohmann::json& json, const std::string& path, int depth) {
+    using Type = nlohmann::json::value_t;
+    if (depth > kMaxDepth) return Fail(path, "nested too deeply");
+    switch (json.type()) {
+      case Type::string:
+        return plist::Value(json.get<std::string>());
+      case Type::number_integer:
+        return plist::Value(json.get<std::int64_t>());
+      case Type::number_unsigned:
+        if (auto number = Int64FromTag(json)) return plist::Value(*number);
+        return Fail(path, "is outside the signed 64-bit range of a property-list integer (store it as text, or "
+                          "as a real with --type real)");
+      case Type::number_float:
+        return plist::Value(json.get<double>());
+      case Type::boolean:
+        return plist::Value(json.get<bool>());
+      case Type::array: {
+        plist::Array array;
+        for (std::size_t i = 0; i < json.size(); ++i) {
+          std::optional<plist::Value> item = Read(json[i], path + "/" + std::to_string(i), depth + 1);
+          if (!item) return std::nullopt;
+          array.push_back(std::move(*item));
         }
-        if (tag == kDateTag) {
-          std::optional<plist::Date> date = ParseIsoDate(text);
-          return date ? std::optional<plist::Value>(plist::Value(*date)) : std::nullopt;
+        return plist::Value(std::move(array));
+      }
+      case Type::object:
+        if (const std::string_view tag = TagOf(json); !tag.empty()) {
+          return ReadTagged(tag, json.begin().value(), path + "/" + std::string(tag), depth);
         }
-      }
-      plist::Dictionary dictionary;
-      for (auto it = json.begin(); it != json.end(); ++it) {
-        std::optional<plist::Value> converted = PropertyListFromJson(it.value());
-        if (!converted) return std::nullopt;
-        dictionary.insert_or_assign(it.key(), std::move(*converted));
-      }
-      return plist::Value(std::move(dictionary));
+        return ReadMembers(json, path, depth);
+      case Type::null:
+        return Fail(path, "is null, which has no property-list form");
+      default:
+        return Fail(path, "has no property-list form");
     }
-    default:  // null, binary, discarded
-      return std::nullopt;
   }
+
+ private:
+  std::optional<plist::Value> ReadMembers(const nlohmann::json& object, const std::string& path, int depth) {
+    plist::Dictionary dictionary;
+    for (const auto& [key, member] : object.items()) {
+      std::optional<plist::Value> value = Read(member, path + "/" + key, depth + 1);
+      if (!value) return std::nullopt;
+      dictionary.insert_or_assign(key, std::move(*value));
+    }
+    return plist::Value(std::move(dictionary));
+  }
+
+  std::optional<plist::Value> ReadTagged(std::string_view tag, const nlohmann::json& value, const std::string& where,
+                                         int depth) {
+    if (IsBytesTag(tag)) {
+      std::string reason;
+      if (auto bytes = BytesFromTag(tag, value, &reason, note_)) return plist::Value(std::move(*bytes));
+      return Fail(where, reason);
+    }
+    if (tag == kDateTag) {
+      if (auto date = value.is_string() ? ParseIsoDate(value.get_ref<const std::string&>()) : std::nullopt) {
+        return plist::Value(*date);
+      }
+      return Fail(where, "expects an ISO 8601 UTC date such as \"2024-05-01T12:00:00Z\"");
+    }
+    if (tag == kInt64Tag || tag == kUint64Tag) {
+      const std::optional<std::uint64_t> unsigned_number = tag == kUint64Tag ? Uint64FromTag(value) : std::nullopt;
+      const std::optional<std::int64_t> number =
+          tag == kInt64Tag ? Int64FromTag(value) : unsigned_number ? Int64FromTag(*unsigned_number) : std::nullopt;
+      if (number) return plist::Value(*number);
+      return Fail(where, "expects an integer in the signed 64-bit range of a property-list integer");
+    }
+    if (tag == kDoubleTag) {
+      if (auto number = DoubleFromTag(value)) return plist::Value(*number);
+      return Fail(where, "expects a number, \"nan\", \"inf\" or \"-inf\"");
+    }
+    if (tag == kDictionaryTag) {
+      if (value.is_object()) return ReadMembers(value, where, depth + 1);
+      return Fail(where, "expects a JSON object");
+    }
+    return Fail(where, UnknownTagReason());
+  }
+
+  std::optional<plist::Value> Fail(const std::string& path, std::string_view reason) {
+    if (error_) *error_ = DescribePointer(path) + " " + std::string(reason);
+    return std::nullopt;
+  }
+
+  std::string* error_;
+  std::string* note_;
+};
+
+}  // namespace
+
+std::optional<plist::Value> PropertyListFromJson(const nlohmann::json& json, std::string* error, std::string* note) {
+  return PropertyListReader(error, note).Read(json, "", 0);
+}
+
+std::optional<plist::Value> PropertyListFromJson(const nlohmann::json& json) {
+  return PropertyListFromJson(json, nullptr, nullptr);
 }
 
 }  // namespace lumeris::cli

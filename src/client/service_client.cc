@@ -14,6 +14,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <string_view>
 #include <thread>
 #include <vector>
 
@@ -159,16 +160,39 @@ int OpenServiceLog() {
 
 }  // namespace
 
-bool StartFileService(const std::filesystem::path& program, std::string* error) {
+bool StartFileService(const std::filesystem::path& program, std::string* error, int* start_report) {
   // Everything the children need is prepared before fork(): after it only async-signal-safe
   // calls are made, since the caller may have other threads.
   const std::string program_text = program.string();
   const int log_fd = OpenServiceLog();
   char* const argv[] = {const_cast<char*>(program_text.c_str()), nullptr};
+  // The service's start report arrives on fd 4 of the service (see ServiceMain).
+  std::vector<std::string> environment;
+  for (char** entry = environ; *entry != nullptr; ++entry) {
+    if (std::string_view(*entry).starts_with("LUMERIS_START_REPORT_FD=")) continue;
+    environment.emplace_back(*entry);
+  }
+  if (start_report) environment.emplace_back("LUMERIS_START_REPORT_FD=4");
+  std::vector<char*> envp;
+  for (std::string& entry : environment) envp.push_back(entry.data());
+  envp.push_back(nullptr);
+  int ready[2] = {-1, -1};
+  if (start_report && pipe2(ready, O_CLOEXEC) != 0) {
+    SetError(error, std::string("pipe2: ") + strerror(errno));
+    if (log_fd >= 0) close(log_fd);
+    return false;
+  }
+  const auto close_ready = [&ready] {
+    for (int& fd : ready) {
+      if (fd >= 0) close(fd);
+      fd = -1;
+    }
+  };
   int report[2];
   if (pipe2(report, O_CLOEXEC) != 0) {
     SetError(error, std::string("pipe2: ") + strerror(errno));
     if (log_fd >= 0) close(log_fd);
+    close_ready();
     return false;
   }
   pid_t child = fork();
@@ -177,6 +201,7 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
     close(report[0]);
     close(report[1]);
     if (log_fd >= 0) close(log_fd);
+    close_ready();
     return false;
   }
   if (child == 0) {
@@ -193,13 +218,17 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
       dup2(null_fd, 1);
       dup2(log_fd >= 0 ? log_fd : null_fd, 2);
     }
-    // Keep only the report pipe (as fd 3, closed by a successful exec) beside 0..2.
+    // Keep only the exec report pipe (as fd 3, closed by a successful exec) and the start report
+    // pipe (as fd 4, kept open for the service) beside 0..2. fd 5 holds a copy first, so that
+    // neither dup2 overwrites the other's source.
+    const int start_copy = ready[1] >= 0 ? fcntl(ready[1], F_DUPFD_CLOEXEC, 5) : -1;
     if (report[1] != 3) {
       dup2(report[1], 3);
       fcntl(3, F_SETFD, FD_CLOEXEC);
     }
-    close_range(4, ~0U, 0);
-    execv(argv[0], argv);
+    if (start_copy >= 0) dup2(start_copy, 4);  // dup2 leaves fd 4 open across exec
+    close_range(start_copy >= 0 ? 5 : 4, ~0U, 0);
+    execve(argv[0], argv, envp.data());
     int failure = errno;
     ssize_t ignored = write(3, &failure, sizeof failure);
     (void)ignored;
@@ -207,6 +236,8 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
   }
   close(report[1]);
   if (log_fd >= 0) close(log_fd);
+  if (ready[1] >= 0) close(ready[1]);
+  ready[1] = -1;
   int status = 0;
   while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
   }
@@ -218,12 +249,15 @@ bool StartFileService(const std::filesystem::path& program, std::string* error) 
   close(report[0]);
   if (got == static_cast<ssize_t>(sizeof failure)) {
     SetError(error, "cannot execute " + program_text + ": " + strerror(failure));
+    close_ready();
     return false;
   }
   if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
     SetError(error, "cannot start " + program_text);
+    close_ready();
     return false;
   }
+  if (start_report) *start_report = ready[0];
   return true;
 }
 
@@ -257,20 +291,45 @@ std::unique_ptr<ServiceClient> ServiceClient::Connect(const ServiceClientOptions
                         " was not found (set LUMERIS_FILESERVICE)");
     return nullptr;
   }
-  if (!StartFileService(*program, &why)) {
+  int report_fd = -1;
+  if (!StartFileService(*program, &why, &report_fd)) {
     SetError(error, why);
     return nullptr;
   }
-  auto pause = std::chrono::microseconds(500);
+  // Waits on the start report between connection attempts: the service's reason, or the end of
+  // the pipe (it listens, or it has exited), ends the wait at once.
+  std::string report;
+  bool report_ended = false;
+  int pause_ms = 1;
   while (true) {
     fd = ConnectTo(*path);
-    if (fd >= 0) return std::make_unique<ServiceClient>(fd, options.send_timeout);
-    if (Clock::now() >= deadline) break;
-    std::this_thread::sleep_for(pause);
-    pause = std::min<std::chrono::microseconds>(pause * 2, std::chrono::milliseconds(50));
+    const int connect_errno = errno;
+    if (fd >= 0) break;
+    if (report_ended || Clock::now() >= deadline) {
+      errno = connect_errno;
+      break;
+    }
+    pollfd waiting{report_fd, POLLIN, 0};
+    if (poll(&waiting, 1, std::min(pause_ms, MillisecondsUntil(deadline))) > 0) {
+      char buffer[512];
+      const ssize_t n = read(report_fd, buffer, sizeof buffer);
+      if (n > 0) report.append(buffer, static_cast<std::size_t>(n));
+      if (n == 0 || (n < 0 && errno != EINTR && errno != EAGAIN)) report_ended = true;
+    }
+    pause_ms = std::min(pause_ms * 2, 50);
   }
-  SetError(error, "started " + program->string() + " but could not connect to " + path->string() +
-                      ": " + strerror(errno));
+  const int saved_errno = errno;
+  close(report_fd);
+  if (fd >= 0) return std::make_unique<ServiceClient>(fd, options.send_timeout);
+  if (!report.empty()) {
+    SetError(error, std::string(kProgramName) + ": " + report);
+  } else if (report_ended) {
+    SetError(error, "started " + program->string() + " but could not connect to " + path->string() +
+                        ": it ended before listening (its log says why; see lumeris status)");
+  } else {
+    SetError(error, "started " + program->string() + " but could not connect to " + path->string() + ": " +
+                        strerror(saved_errno));
+  }
   return nullptr;
 }
 
@@ -281,12 +340,28 @@ ServiceClient::ServiceClient(int fd, std::chrono::milliseconds send_timeout)
 
 ServiceClient::~ServiceClient() { close(fd_); }
 
-void ServiceClient::MarkClosed() {
-  if (open_.exchange(false)) shutdown(fd_, SHUT_RDWR);
+void ServiceClient::MarkClosed(std::string reason) {
+  if (!open_.exchange(false)) return;
+  shutdown(fd_, SHUT_RDWR);
+  std::lock_guard<std::mutex> hold(reason_mutex_);
+  close_reason_ = std::move(reason);
+}
+
+std::string ServiceClient::CloseReason() const {
+  std::lock_guard<std::mutex> hold(reason_mutex_);
+  return close_reason_;
+}
+
+int ServiceClient::PeerProcessId() const {
+  ucred peer{};
+  socklen_t size = sizeof peer;
+  if (getsockopt(fd_, SOL_SOCKET, SO_PEERCRED, &peer, &size) != 0 || peer.pid <= 0) return -1;
+  return peer.pid;
 }
 
 bool ServiceClient::SendFrame(const Frame& frame) {
   const std::string bytes = EncodeFrame(frame);
+  if (bytes.size() > kMaxFrameBytes) return false;
   std::lock_guard<std::mutex> hold(send_mutex_);
   if (!open_) return false;
   const Clock::time_point deadline = Clock::now() + send_timeout_;
@@ -303,7 +378,7 @@ bool ServiceClient::SendFrame(const Frame& frame) {
       int left = MillisecondsUntil(deadline);
       if (left > 0 && poll(&waiting, 1, left) >= 0) continue;
     }
-    MarkClosed();
+    MarkClosed("the connection to the file service ended while sending");
     return false;
   }
   return true;
@@ -326,18 +401,26 @@ void ServiceClient::ReadSome(Clock::time_point deadline) {
   char buffer[64 * 1024];
   ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
   if (n < 0) {
-    if (errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) MarkClosed();
+    if (errno != EAGAIN && errno != EWOULDBLOCK && errno != EINTR) {
+      MarkClosed(std::string("reading from the file service failed: ") + strerror(errno));
+    }
     return;
   }
   if (n == 0) {
-    MarkClosed();
+    MarkClosed(
+        "the file service closed the connection without replying (it does so for a reply over the 16 MiB one "
+        "message may hold, and when it stops; its log says why: see lumeris status)");
     return;
   }
   decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
   while (std::optional<Frame> frame = decoder_.Next()) {
     if (frame->kind == FrameKind::kReply) replies_.insert_or_assign(frame->id, std::move(frame->body));
   }
-  if (decoder_.error()) MarkClosed();
+  if (std::optional<FrameError> problem = decoder_.error()) {
+    MarkClosed(*problem == FrameError::kTooBig
+                   ? "the file service's reply is over the 16 MiB one message may hold; it was not read"
+                   : "the file service sent a malformed reply (" + std::string(FrameErrorName(*problem)) + ")");
+  }
 }
 
 std::optional<MessageValue> ServiceClient::WaitForReply(std::uint64_t id,

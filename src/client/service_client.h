@@ -12,7 +12,9 @@
 // Connect() finds the socket as the service does ($XDG_RUNTIME_DIR, else /tmp/lumeris-<uid>).
 // When nothing listens there it starts `lumeris-fileservice` itself, detached in its own session,
 // at most one starter at a time (an exclusive lock on "<socket>.lock" beside the socket), and
-// retries until it connects or the start timeout passes. The program is found through the
+// retries until it connects or the start timeout passes. The started service reports through a
+// pipe (LUMERIS_START_REPORT_FD) why it cannot listen, so that failure is told at once, in the
+// service's own words, instead of after the timeout. The program is found through the
 // environment variable LUMERIS_FILESERVICE, else next to the running executable, else in the
 // installation's bin directory, else on PATH.
 //
@@ -64,7 +66,8 @@ class ServiceClient {
   ServiceClient& operator=(const ServiceClient&) = delete;
 
   // Sends `message` (a dictionary) as a message that wants no reply. False when the connection
-  // is gone or the send timed out (the connection is then closed).
+  // is gone or the send timed out (the connection is then closed), or when the message would be
+  // a frame over kMaxFrameBytes (it is not sent; the connection stays open).
   bool Send(const MessageValue& message);
   // Sends `message` as a message that wants a reply; returns its id, or std::nullopt as Send().
   std::optional<std::uint64_t> SendWantingReply(const MessageValue& message);
@@ -77,17 +80,24 @@ class ServiceClient {
 
   // False once the service closed the connection, sent malformed bytes or a send failed.
   bool IsOpen() const { return open_.load(); }
+  // Why the connection ended, as a sentence for the user; empty while it is open.
+  std::string CloseReason() const;
+  // The process id of the service at the other end (SO_PEERCRED), or -1.
+  int PeerProcessId() const;
 
  private:
   bool SendFrame(const Frame& frame);
   // Reads what the socket has, waiting until `deadline`; stores replies. REQUIRES: receive_mutex_.
   void ReadSome(std::chrono::steady_clock::time_point deadline);
-  void MarkClosed();
+  void MarkClosed(std::string reason);
 
   const int fd_;
   const std::chrono::milliseconds send_timeout_;
   std::atomic<bool> open_{true};
   std::atomic<std::uint64_t> next_id_{1};
+
+  mutable std::mutex reason_mutex_;  // guards close_reason_
+  std::string close_reason_;
 
   std::mutex send_mutex_;  // guards writes to fd_
 
@@ -108,7 +118,9 @@ inline constexpr long kMaxServiceLogBytes = 256 * 1024;
 // Starts `program` detached: in a new session, with standard input and output on /dev/null,
 // standard error on the systemd journal when it runs (else on ServiceLogFile()), inheriting the
 // environment, and not a child of this process. False, with the reason in `*error`, when it
-// could not be executed.
-bool StartFileService(const std::filesystem::path& program, std::string* error = nullptr);
+// could not be executed. With `report`, `*report` receives the read end of the start-report
+// pipe (close-on-exec, owned by the caller): the service writes there why it cannot listen, and
+// the pipe ends (end of file) once it listens or exits.
+bool StartFileService(const std::filesystem::path& program, std::string* error = nullptr, int* report = nullptr);
 
 }  // namespace lumeris

@@ -8,6 +8,8 @@
 #include <ctime>
 #include <memory>
 
+#include <nlohmann/json.hpp>
+
 #include "platform/distributed_notifications.h"
 
 namespace lumeris::cli {
@@ -63,7 +65,7 @@ class ScopedStopSignals {
 int RunWatch(const WatchRequest& request, std::ostream& out, std::ostream& err, const std::function<void()>& ready) {
   std::unique_ptr<DistributedNotificationObserver> observer = DistributedNotificationObserver::Open(request.name);
   if (!observer) {
-    err << "lumeris watch: no session bus is reachable\n";
+    err << "lumeris: watch: no session bus is reachable\n";
     return 1;
   }
   ScopedStopSignals signals(observer.get());
@@ -74,7 +76,13 @@ int RunWatch(const WatchRequest& request, std::ostream& out, std::ostream& err, 
     limits.timeout = std::chrono::milliseconds(static_cast<std::int64_t>(*request.timeout_seconds * 1000));
   }
   observer->Run(
-      [&out](const DistributedNotification& notification) {
+      [&out, &request](const DistributedNotification& notification) {
+        if (request.json) {
+          out << nlohmann::json{{"time", LocalTimeNow()}, {"name", notification.name}, {"object", notification.object}}
+                     .dump(-1, ' ', false, nlohmann::json::error_handler_t::replace)
+              << std::endl;
+          return;
+        }
         out << LocalTimeNow() << "  " << notification.name;
         if (!notification.object.empty()) out << "  " << notification.object;
         out << std::endl;
@@ -83,14 +91,19 @@ int RunWatch(const WatchRequest& request, std::ostream& out, std::ostream& err, 
   return 0;
 }
 
-CLI::App* AddWatchCommand(CLI::App& app, std::ostream& out, std::ostream& err) {
+CLI::App* AddWatchCommand(CLI::App& app, std::ostream& out, std::ostream& err, const bool* json) {
   CLI::App* watch = app.add_subcommand("watch", "Print distributed notifications as they arrive");
   auto request = std::make_shared<WatchRequest>();
-  watch->add_option("--name", request->name, "Only notifications of this name");
-  watch->add_option("--count", request->count, "Stop after this many notifications")->check(CLI::PositiveNumber);
-  watch->add_option("--timeout", request->timeout_seconds, "Stop after this many seconds")
+  watch->add_option("--name", request->name, "only notifications of this name");
+  watch->add_option("--count", request->count, "stop after this many notifications")->check(CLI::PositiveNumber);
+  watch->add_option("--timeout", request->timeout_seconds, "stop after this many seconds")
       ->check(CLI::NonNegativeNumber);
-  watch->callback([request, &out, &err] {
+  watch->footer(
+      "Examples:\n"
+      "  lumeris watch\n"
+      "  lumeris --json watch --name LMLumerisRecentsChangedNotification --count 1");
+  watch->callback([request, &out, &err, json] {
+    request->json = json != nullptr && *json;
     const int status = RunWatch(*request, out, err);
     if (status != 0) throw CLI::RuntimeError(status);
   });

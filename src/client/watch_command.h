@@ -1,7 +1,8 @@
 // `lumeris watch`: prints each distributed notification as it arrives, one line each:
 //   <local time, YYYY-MM-DD HH:MM:SS.mmm>  <name>[  <object>]
 // until interrupted (SIGINT or SIGTERM), or until --count notifications or --timeout seconds
-// when given. --name limits it to one notification name.
+// when given. --name limits it to one notification name. With the program's --json each
+// notification is one JSON line: {"time": "<local time>", "name": "<name>", "object": "<object>"}.
 //
 // Exit status: 0, or 1 when no session bus is reachable.
 //
@@ -23,6 +24,7 @@ struct WatchRequest {
   std::optional<std::string> name;
   std::optional<std::size_t> count;
   std::optional<double> timeout_seconds;
+  bool json = false;
 };
 
 // Runs until interrupted or a limit is reached; returns the exit status. `ready`, when given,
@@ -31,6 +33,7 @@ int RunWatch(const WatchRequest& request, std::ostream& out, std::ostream& err,
              const std::function<void()>& ready = nullptr);
 
 // Adds the "watch" subcommand to `app`; a non-zero status is reported as CLI::RuntimeError.
-CLI::App* AddWatchCommand(CLI::App& app, std::ostream& out, std::ostream& err);
+// `json`, when given, is the program's --json flag (read at run time).
+CLI::App* AddWatchCommand(CLI::App& app, std::ostream& out, std::ostream& err, const bool* json = nullptr);
 
 }  // namespace lumeris::cli

@@ -5,6 +5,8 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <cstdlib>
+
 #include <array>
 #include <asio.hpp>
 #include <mutex>
@@ -43,6 +45,13 @@ class AsioConnection final : public ServiceConnection,
 
   void SendMessage(const Frame& frame) override {
     std::string bytes = EncodeFrame(frame);
+    if (bytes.size() > kMaxFrameBytes) {
+      // No client may accept it; the connection ends instead of the reply arriving malformed.
+      Log("closing a connection: its reply is " + std::to_string(bytes.size()) +
+          " bytes, over the 16 MiB one message may hold");
+      asio::dispatch(strand_, [self = shared_from_this()] { self->Close(); });
+      return;
+    }
     asio::dispatch(strand_, [self = shared_from_this(), bytes = std::move(bytes)]() mutable {
       self->QueueWrite(std::move(bytes));
     });
@@ -272,7 +281,24 @@ void ServiceServer::Start() { impl_->Start(); }
 
 void ServiceServer::Stop() { impl_->Stop(); }
 
+namespace {
+
+// A program that starts the service and waits for it (the client library's on-demand start)
+// passes the write end of a pipe as LUMERIS_START_REPORT_FD: the service writes why it cannot
+// listen to it, or closes it once it listens. -1 when there is none.
+int TakeStartReportFd() {
+  const char* text = getenv("LUMERIS_START_REPORT_FD");
+  int fd = -1;
+  if (text != nullptr && *text >= '0' && *text <= '9') fd = atoi(text);
+  unsetenv("LUMERIS_START_REPORT_FD");
+  if (fd >= 0 && fcntl(fd, F_SETFD, FD_CLOEXEC) != 0) fd = -1;
+  return fd;
+}
+
+}  // namespace
+
 int ServiceMain(const ConnectionHandler& handler) {
+  const int start_report = TakeStartReportFd();
   // Replies to a peer that has gone must not kill the process.
   signal(SIGPIPE, SIG_IGN);
   // The pool's threads inherit this mask, so the two signals reach only sigwait() below.
@@ -286,8 +312,15 @@ int ServiceMain(const ConnectionHandler& handler) {
   std::optional<ServiceListener> listener = OpenServiceListener(&why);
   if (!listener) {
     Log("cannot listen: " + why);
+    if (start_report >= 0) {
+      const std::string reason = "cannot listen: " + why;
+      ssize_t ignored = write(start_report, reason.data(), reason.size());
+      (void)ignored;
+      close(start_report);
+    }
     return 1;
   }
+  if (start_report >= 0) close(start_report);
   {
     ServiceServer server(listener->fd, handler);
     server.Start();

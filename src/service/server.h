@@ -4,7 +4,9 @@
 //
 // Each accepted peer is checked with SO_PEERCRED before anything is read: a peer whose uid
 // differs from the service's is closed at once. A connection that sends a malformed frame is
-// logged once and closed; nothing else is affected.
+// logged once and closed; nothing else is affected. A reply that would be a frame over
+// kMaxFrameBytes is not sent: the connection is logged and closed instead, since every reader
+// must refuse such a frame.
 //
 //   ServiceServer server(listener.fd, ServiceConnectionHandler);
 //   server.Start();   // returns at once; the pool serves until Stop()
@@ -42,6 +44,9 @@ class ServiceServer {
 // The service's main loop: opens the listener (systemd's socket, else its own), serves with
 // `handler` until SIGTERM or SIGINT, then removes the socket file it bound (never one systemd
 // handed over). Returns the process's exit status: 0 after a signal, 1 when it cannot listen.
+// When LUMERIS_START_REPORT_FD names an open descriptor (set by the program that started the
+// service and waits for it), the reason it cannot listen is also written there; the descriptor is
+// closed once the service listens.
 int ServiceMain(const ConnectionHandler& handler);
 
 }  // namespace lumeris

@@ -46,8 +46,9 @@ bool EnsurePrivateDirectory(const std::filesystem::path& directory, std::string*
 }
 
 std::optional<std::filesystem::path> ServiceSocketPath(std::string* why) {
+  // The XDG rules make a relative XDG_RUNTIME_DIR invalid: it is ignored like an unset one.
   const char* runtime = getenv("XDG_RUNTIME_DIR");
-  if (runtime != nullptr && *runtime != '\0') {
+  if (runtime != nullptr && runtime[0] == '/') {
     return std::filesystem::path(runtime) / kServiceName;
   }
   std::filesystem::path directory = FallbackRuntimeDirectory(geteuid());

@@ -1,6 +1,7 @@
 // Where the service listens: $XDG_RUNTIME_DIR/com.vantorel.Lumeris.FileService, or, without
-// XDG_RUNTIME_DIR, /tmp/lumeris-<uid>/com.vantorel.Lumeris.FileService in a directory of mode
-// 0700 owned by the user. The service and every client resolve the path the same way.
+// XDG_RUNTIME_DIR (or with a relative one, which the XDG rules make invalid),
+// /tmp/lumeris-<uid>/com.vantorel.Lumeris.FileService in a directory of mode 0700 owned by the
+// user. The service and every client resolve the path the same way.
 //
 // Thread-safety: reads the environment and the file system; safe to call from any thread as
 // long as nobody changes the environment at the same time.

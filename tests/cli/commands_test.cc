@@ -1,8 +1,8 @@
-// Command lines to requests and replies to output, without a service: the commands run against
-// a channel that records what they send and answers from a script.
+// Command lines to requests, replies to output, and every error to its exit status and message,
+// without a service: the commands run against a channel that records what they send and
+// answers from a script.
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <initializer_list>
 #include <map>
 #include <sstream>
@@ -16,9 +16,7 @@
 namespace lumeris::cli {
 namespace {
 
-using namespace std::chrono_literals;
 using Args = std::vector<std::string>;
-using Answer = std::function<std::optional<MessageValue>(const MessageValue&)>;
 
 // What a command handed to the channel.
 struct Sent {
@@ -27,28 +25,7 @@ struct Sent {
   std::chrono::milliseconds timeout;
 };
 
-class ScriptedChannel : public ServiceChannel {
- public:
-  // The reply to a request, or std::nullopt for "none in time".
-  Answer answer = [](const MessageValue&) { return MessageValue::MakeDictionary(); };
-  bool deliver = true;
-  std::vector<Sent> sent;
-
-  std::optional<MessageValue> Request(const MessageValue& request, std::chrono::milliseconds timeout,
-                                      std::string* error) override {
-    sent.push_back({request, true, timeout});
-    std::optional<MessageValue> reply = answer(request);
-    if (!reply && error) *error = "no reply from the file service within " + DescribeTimeout(timeout);
-    return reply;
-  }
-  bool Send(const MessageValue& request, std::chrono::milliseconds timeout, std::string* error) override {
-    sent.push_back({request, false, timeout});
-    if (!deliver && error) *error = "cannot reach the file service: test";
-    return deliver;
-  }
-};
-
-// A message written as JSON (escapes included), so the tables read like the wire.
+// A message written as JSON (tags included), so the tables read like the wire.
 MessageValue Json(const std::string& text) {
   std::string error;
   std::optional<MessageValue> value = MessageValueFromJsonText(text, &error);
@@ -56,20 +33,33 @@ MessageValue Json(const std::string& text) {
   return value.value_or(MessageValue());
 }
 
-// Answers by command; commands not listed get no reply.
-Answer ByCommand(std::map<std::string, const char*> replies) {
-  return [replies](const MessageValue& request) -> std::optional<MessageValue> {
-    const auto found = replies.find(*request.GetString("command"));
-    if (found == replies.end()) return std::nullopt;
-    return Json(found->second);
-  };
-}
+class ScriptedChannel : public ServiceChannel {
+ public:
+  // Replies by command (JSON); commands not listed get none. "*" answers every other command.
+  std::map<std::string, std::string> replies = {{"*", "{}"}};
+  bool deliver = true;
+  std::vector<Sent> sent;
+  std::vector<std::string> removed_keys;
 
-std::string Joined(const Args& args) {
-  std::string text;
-  for (const std::string& arg : args) text += (text.empty() ? "" : " ") + arg;
-  return text;
-}
+  std::optional<MessageValue> Request(const MessageValue& request, std::chrono::milliseconds timeout,
+                                      std::string* error) override {
+    sent.push_back({request, true, timeout});
+    auto found = replies.find(*request.GetString("command"));
+    if (found == replies.end()) found = replies.find("*");
+    if (found != replies.end()) return Json(found->second);
+    *error = "no reply from the file service within " + DescribeTimeout(timeout);
+    return std::nullopt;
+  }
+  bool Send(const MessageValue& request, std::chrono::milliseconds timeout, std::string* error) override {
+    sent.push_back({request, false, timeout});
+    if (!deliver) *error = "cannot reach the file service: test";
+    return deliver;
+  }
+  bool RemoveStoreKey(const std::string& key, std::string*) override {
+    removed_keys.push_back(key);
+    return true;
+  }
+};
 
 class CliCommandTest : public ::testing::Test {
  protected:
@@ -79,6 +69,7 @@ class CliCommandTest : public ::testing::Test {
     for (const std::string& arg : args) argv.push_back(arg.c_str());
     out_.str("");
     err_.str("");
+    channel_.sent.clear();
     return RunCli(static_cast<int>(argv.size()), argv.data(), channel_, out_, err_);
   }
   std::string output() const { return out_.str(); }
@@ -92,173 +83,171 @@ class CliCommandTest : public ::testing::Test {
 #define LMK R"(com.vantorel.lmk:{\")"
 #define STORE R"("identifier":"com.vantorel.Lumeris.DefaultDataStorage")"
 
-struct RequestCase {
-  Args args;
-  const char* request_json;
-  bool wants_reply;
-};
-
+// The last request a command line sends (favourites add and remove read the list first).
 TEST_F(CliCommandTest, EverySubcommandBuildsItsRequestDictionary) {
-  for (const RequestCase& c : std::initializer_list<RequestCase>{
+  channel_.replies["read"] = R"({"array":[")" LMK R"(char\":\"A\"}"]})";
+  const std::string here = std::filesystem::current_path().string();
+  for (const auto& [args, request_json, wants_reply] : std::initializer_list<std::tuple<Args, std::string, bool>>{
            {{"search", "cat face", "--limit", "3"},
             R"({"command":"search_matched_chars","string":"cat face","limit":3,"transactionID":1})", true},
-           {{"related", "中"}, R"({"command":"search_related_chars","string":"中","limit":20,"transactionID":1})", true},
-           {{"info", "中", "--transaction-id", "9"},
-            R"({"command":"search_character_info","string":"中","transactionID":9})", true},
-           {{"categories", "Emoji", "Arrows"}, R"({"command":"read_categorydata","categories":["Emoji","Arrows"]})", true},
-           {{"recents"}, R"({"command":"read","target":"recents",)" STORE "}", true},
-           {{"favorites", "--identifier", "X"}, R"({"command":"read","target":"favorites","identifier":"X"})", true},
+           {{"info", "中", "--transaction-id", "9"}, R"({"command":"search_character_info","string":"中","transactionID":9})",
+            true},
+           {{"favorites", "read", "--identifier", "X"}, R"({"command":"read","target":"favorites","identifier":"X"})", true},
            {{"recents", "set", "A", R"(com.vantorel.lmk:{"char":"B"})"},
-            R"({"command":"set","target":"recents",)" STORE R"(,"array":[")" LMK R"(char\":\"A\"}",")" LMK
-            R"(char\":\"B\"}"]})", false},
+            R"({"command":"set","target":"recents",)" STORE R"(,"array":[")" LMK R"(char\":\"A\"}",")" LMK R"(char\":\"B\"}"]})",
+            false},
            // No items: no "array", which removes the list.
            {{"favorites", "set", "--identifier", "X"}, R"({"command":"set","target":"favorites","identifier":"X"})", false},
-           {{"favorites", "set", "😀", "--emoji-font"},
-            R"({"command":"set","target":"favorites",)" STORE R"(,"array":[")" LMK
+           {{"favorites", "add", "😀", "--emoji-font"},
+            R"({"command":"set","target":"favorites",)" STORE R"(,"array":[")" LMK R"(char\":\"A\"}",")" LMK
             R"(char\":\"😀\",\"font\":\"VantorelColorEmoji\"}"]})", false},
+           {{"favorites", "remove", "A"}, R"({"command":"set","target":"favorites",)" STORE "}", false},
            // --identifier belongs to "recents" but may follow "add".
            {{"recents", "add", "A", "--font", "F", "--glyph", "7", "--identifier", "Y"},
-            R"({"command":"add","target":"recents","identifier":"Y","item":")" LMK
-            R"(char\":\"A\",\"font\":\"F\",\"glyph\":7}"})", false},
-           {{"skintone", "👍🏽", "--emoji-font"},
-            R"({"command":"set_skintone",)" STORE R"(,"item":")" LMK R"(char\":\"👍🏽\",\"font\":\"VantorelColorEmoji\"}"})",
+            R"({"command":"add","target":"recents","identifier":"Y","item":")" LMK R"(char\":\"A\",\"font\":\"F\",\"glyph\":7}"})",
             false},
+           // An emoji's skin tone is recorded in the emoji font without being asked.
+           {{"skintone", "👍🏽"},
+            R"({"command":"set_skintone",)" STORE R"(,"item":")" LMK R"(char\":\"👍🏽\",\"font\":\"VantorelColorEmoji\"}"})", false},
            {{"state", "save", "--application", "app", R"({"a": 1})"},
-            R"({"command":"save_state","application":"app","data":{"$data":"eyJhIjogMX0="}})", false},
-           {{"state", "save", "{}"},
-            R"({"command":"save_state","application":"com.vantorel.lumeris-cli","data":{"$data":"e30="}})", false},
+            R"({"command":"save_state","application":"app","data":{"$base64":"eyJhIjogMX0="}})", false},
+           {{"state", "--application", "app"},
+            R"({"command":"read_recents_favorites",)" STORE R"(,"application":"app"})", true},
            {{"read-all", "--identifier", "X", "--application", "Y"},
             R"({"command":"read_recents_favorites","identifier":"X","application":"Y"})", true},
-           {{"open-large-viewer", "/tmp/p"}, R"({"command":"open_large_viewer","path":"/tmp/p"})", true},
+           {{"open-large-viewer", "p"}, R"({"command":"open_large_viewer","path":")" + here + R"(/p"})", true},
            {{"open-large-viewer"}, R"({"command":"open_large_viewer"})", true},
-           {{"raw", R"({"command":"x","limit":{"$uint64":"5"},"n":{"$int64":"-2"}})"},
-            R"({"command":"x","limit":5,"n":-2})", true},
-           {{"raw", "--no-reply", R"({"command":"add","data":{"$data":"AP8="},"v":null})"},
-            R"({"command":"add","data":{"$data":"AP8="},"v":null})", false}}) {
-    SCOPED_TRACE(Joined(c.args));
-    channel_.sent.clear();
-    ASSERT_EQ(run(c.args), 0) << errors();
-    ASSERT_EQ(channel_.sent.size(), 1u);
-    EXPECT_EQ(channel_.sent[0].request, Json(c.request_json));
-    EXPECT_EQ(channel_.sent[0].wants_reply, c.wants_reply);
+           {{"raw", R"({"command":"x","limit":{"$uint64":"5"},"n":{"$int64":"-2"},"h":{"$hex":"00ff"}})"},
+            R"({"command":"x","limit":5,"n":-2,"h":{"$base64":"AP8="}})", true},
+           {{"raw", "--no-reply", R"({"command":"add","data":{"$base64":"AP8="},"v":null})"},
+            R"({"command":"add","data":{"$base64":"AP8="},"v":null})", false}}) {
+    SCOPED_TRACE(::testing::PrintToString(args));
+    ASSERT_EQ(run(args), 0) << errors();
+    ASSERT_FALSE(channel_.sent.empty());
+    EXPECT_EQ(channel_.sent.back().request, Json(request_json));
+    EXPECT_EQ(channel_.sent.back().wants_reply, wants_reply);
   }
+  ASSERT_EQ(run({"recents", "--timeout", "0.25"}), 0);
+  EXPECT_EQ(channel_.sent.back().timeout, std::chrono::milliseconds(250));
 }
-
-TEST_F(CliCommandTest, TimeoutOptionReachesTheChannelBeforeOrAfterTheSubcommand) {
-  ASSERT_EQ(run({"--timeout", "0.25", "recents"}), 0);
-  ASSERT_EQ(run({"recents", "--timeout", "2"}), 0);
-  ASSERT_EQ(channel_.sent.size(), 2u);
-  EXPECT_EQ(channel_.sent[0].timeout, 250ms);
-  EXPECT_EQ(channel_.sent[1].timeout, 2000ms);
-}
-
-struct OutputCase {
-  Args args;
-  const char* reply_json;
-  const char* output;  // exact text; with --json, compared as JSON
-};
 
 TEST_F(CliCommandTest, PrintsRepliesForPeopleOrAsJson) {
-  for (const OutputCase& c : std::initializer_list<OutputCase>{
+  for (const auto& [args, reply_json, printed] : std::initializer_list<std::tuple<Args, const char*, const char*>>{
            {{"search", "smil"}, R"({"result":["😀","☺"],"transactionID":1})", "😀\tU+1F600\n☺\tU+263A\n"},
-           {{"--json", "search", "smil"}, R"({"result":["😀","☺"],"transactionID":1})",
-            R"({"result":["😀","☺"],"transactionID":1})"},
-           {{"search", "zzz"}, R"({"result":[],"transactionID":1})", "no characters found\n"},
-           {{"recents"}, R"({"array":null})", "(empty)\n"},
-           // Items print as characters, not only as IDs.
+           {{"recents"}, R"({"array":null})", "(none)\n"},
            {{"recents"}, R"({"array":[")" LMK R"(char\":\"👍🏽\",\"font\":\"VantorelColorEmoji\"}"]})",
             "👍🏽\tU+1F44D U+1F3FD\tVantorelColorEmoji\n"},
            {{"recents", "add", "A"}, "{}", "recents: added A\n"},
+           {{"favorites", "set"}, "{}", "favorites: cleared\n"},
            {{"--json", "recents", "add", "A"}, "{}",
             R"({"sent":{"command":"add","target":"recents",)" STORE R"(,"item":")" LMK R"(char\":\"A\"}"}})"},
-           // The raw reply keeps kinds JSON cannot tell apart, in the escaped notation.
-           {{"--json", "raw", R"({"command":"read"})"}, R"({"d":{"$data":"/w=="},"n":{"$int64":"-4"}})",
-            R"({"d":{"$data":"/w=="},"n":-4})"}}) {
-    SCOPED_TRACE(Joined(c.args));
-    channel_.answer = [&c](const MessageValue&) { return Json(c.reply_json); };
-    ASSERT_EQ(run(c.args), 0) << errors();
-    if (c.args[0] == "--json") {
-      EXPECT_EQ(nlohmann::json::parse(output()), nlohmann::json::parse(c.output)) << output();
+           {{"--json", "raw", "--no-reply", R"({"command":"add"})"}, "{}", R"({"sent":{"command":"add"}})"},
+           {{"state"}, R"({"state":{"$base64":"eyJhIjoxfQ=="}})", "{\"a\":1}\n"},
+           {{"state", "read"}, R"({"state":{"$base64":"e30="}})", "(none)\n"},
+           {{"state", "clear", "--application", "app"}, "{}", "state: cleared for app\n"},
+           {{"open-large-viewer"}, "{}", "open-large-viewer: cleared\n"},
+           // The raw reply keeps kinds JSON cannot tell apart, in the tagged notation.
+           {{"--json", "raw", R"({"command":"read"})"}, R"({"d":{"$base64":"/w=="},"n":{"$int64":"-4"}})",
+            R"({"d":{"$base64":"/w=="},"n":-4})"}}) {
+    SCOPED_TRACE(::testing::PrintToString(args));
+    channel_.replies["*"] = reply_json;
+    ASSERT_EQ(run(args), 0) << errors();
+    if (args[0] == "--json") {
+      EXPECT_EQ(nlohmann::json::parse(output()), nlohmann::json::parse(printed)) << output();
     } else {
-      EXPECT_EQ(output(), c.output);
+      EXPECT_EQ(output(), printed);
     }
   }
+  EXPECT_EQ(channel_.removed_keys, std::vector<std::string>{"State:app"});
 }
 
 // --- Errors ---------------------------------------------------------------------------------
 
-TEST_F(CliCommandTest, BadArgumentsAreRefusedWithoutSendingAnything) {
-  for (const auto& [args, in_error] : std::initializer_list<std::pair<Args, const char*>>{
-           {{"raw", "{\"command\":"}, "not valid JSON"}, {{"raw", "[1, 2]"}, "must be a JSON object"},
-           {{"raw", R"({"limit":{"$uint64":"-5"}})"}, "/limit/$uint64"},
-           {{"state", "save", "not json"}, "not valid JSON"}, {{"recents", "add", "A", "--font", "F"}, "--glyph"},
-           {{"--timeout", "0", "recents"}, "--timeout"}, {{"search"}, "text"}, {{}, "subcommand"}}) {
-    EXPECT_NE(run(args), 0) << Joined(args);
-    EXPECT_TRUE(channel_.sent.empty()) << Joined(args);
-    EXPECT_NE(errors().find(in_error), std::string::npos) << Joined(args) << ": " << errors();
+struct ErrorCase {
+  Args args;
+  int status;
+  std::string first_line;
+  bool answered = true;  // false: the service never replies
+  bool delivered = true;
+};
+
+TEST_F(CliCommandTest, ErrorsExitWithTheirStatusAndSayWhy) {
+  channel_.replies["read"] = R"({"array":[")" LMK R"(char\":\"A\"}"]})";
+  const std::string usage_hint = "lumeris: run 'lumeris --help' for the subcommands, 'lumeris SUBCOMMAND --help' for one";
+  for (const ErrorCase& c : std::initializer_list<ErrorCase>{
+           {{}, 2, "lumeris: a subcommand is required"},
+           {{"recent"}, 2, "lumeris: unknown subcommand \"recent\"; did you mean \"recents\"?"},
+           {{"favorites", "ad", "x"}, 2, "lumeris: favorites: unknown subcommand \"ad\"; did you mean \"add\"?"},
+           {{"--bogus", "recents"}, 2, "lumeris: unknown option \"--bogus\""},
+           {{"--timeout", "abc", "recents"}, 2,
+            "lumeris: --timeout: expects a positive number of seconds (at most 86400), not \"abc\""},
+           {{"recents", "--timeout", "0"}, 2,
+            "lumeris: --timeout: expects a positive number of seconds (at most 86400), not \"0\""},
+           {{"search"}, 2, "lumeris: text is required"},
+           {{"recents", "add", "A", "--font", "F"}, 2, "lumeris: --font requires --glyph"},
+           {{"info", "a\xFF"}, 2, "lumeris: argument 2 is not valid UTF-8"},
+           {{"recents", "add", ""}, 2, "lumeris: recents add: an item is a character or an entity ID, not empty text"},
+           {{"favorites", "set", "com.vantorel.lmk:{oops"}, 2,
+            "lumeris: favorites set: \"com.vantorel.lmk:{oops\" is not a valid entity ID: after \"com.vantorel.lmk:\" "
+            "comes a JSON object such as {\"char\":\"A\"}"},
+           {{"skintone", "A"}, 2, "lumeris: skintone: A is not an emoji that takes a skin tone"},
+           {{"state", "save", "not json"}, 2, "lumeris: state save: not valid JSON: not json"},
+           {{"state", "save", R"({"a":{"b":null}})"}, 2,
+            "lumeris: state save: the state must be a JSON object with no null in it"},
+           {{"state", "save", "{}"}, 2,
+            "lumeris: state save: an empty object changes nothing (state clear removes the state)"},
+           {{"raw", "[1, 2]"}, 2, "lumeris: raw: the request must be a JSON object"},
+           {{"raw", R"({"limit":{"$uint64":"-5"}})"}, 2,
+            "lumeris: raw: /limit/$uint64 expects decimal text of an unsigned 64-bit integer"},
+           {{"raw", R"({"d":{"$data":"AP8"}})"}, 2,
+            "lumeris: raw: /d/$data expects hexadecimal digits or padded base64 text"},
+           {{"open-large-viewer", ""}, 2, "lumeris: open-large-viewer: the path is empty (leave it out to clear it)"},
+           {{"--timeout", "0.5", "info", "中"}, 1, "lumeris: info: no reply from the file service within 0.5 s", false},
+           {{"raw", R"({"command":"add"})"}, 1, "lumeris: raw: no reply from the file service within 5 s", false},
+           {{"favorites", "set", "A"}, 1, "lumeris: favorites set: cannot reach the file service: test", true, false},
+           {{"favorites", "remove", "Z"}, 1, "lumeris: favorites remove: Z is not in the list"},
+           {{"demo"}, 1, "lumeris: demo: no reply from the file service within 5 s", false}}) {
+    SCOPED_TRACE(::testing::PrintToString(c.args));
+    channel_.replies["*"] = "{}";
+    if (!c.answered) channel_.replies.clear();
+    channel_.deliver = c.delivered;
+    EXPECT_EQ(run(c.args), c.status);
+    EXPECT_EQ(errors().substr(0, errors().find('\n')), c.first_line);
+    if (c.status == 2) {
+      EXPECT_EQ(output(), "");
+      EXPECT_TRUE(channel_.sent.empty()) << "a usage error sent a request";
+      if (c.args.empty() || c.args[0].starts_with("-") || c.args[0] == "recent" || c.args[0] == "search") {
+        EXPECT_NE(errors().find(usage_hint), std::string::npos) << errors();
+      }
+    }
   }
-}
-
-TEST_F(CliCommandTest, NoAnswerIsAClearMessageAndStatusOne) {
-  channel_.answer = [](const MessageValue&) { return std::nullopt; };
-  EXPECT_EQ(run({"--timeout", "0.5", "info", "中"}), kExitNoAnswer);
-  EXPECT_EQ(errors(), "lumeris: info: no reply from the file service within 0.5 s\n");
-  EXPECT_EQ(output(), "");
-  // A raw request that gets none points at --no-reply.
-  EXPECT_EQ(run({"raw", R"({"command":"add"})"}), kExitNoAnswer);
-  EXPECT_NE(errors().find("--no-reply"), std::string::npos) << errors();
-
-  channel_.deliver = false;
-  EXPECT_EQ(run({"favorites", "set", "A"}), kExitNoAnswer);
-  EXPECT_EQ(errors(), "lumeris: favorites set: cannot reach the file service: test\n");
 }
 
 // --- Help and demo --------------------------------------------------------------------------
 
-TEST_F(CliCommandTest, HelpNamesEverySubcommandWithAnExample) {
+TEST_F(CliCommandTest, SubcommandHelpShowsItsOwnOptionsAndExamples) {
+  ASSERT_EQ(run({"favorites", "add", "--help"}), 0);
+  EXPECT_NE(output().find("--font"), std::string::npos) << output();
+  EXPECT_NE(output().find("lumeris favorites add "), std::string::npos) << output();
+  EXPECT_EQ(output().find("lumeris search"), std::string::npos) << "the global examples are repeated";
   ASSERT_EQ(run({"--help"}), 0);
-  for (const char* name : {"search", "related", "info", "categories", "recents", "favorites", "skintone",
-                           "state", "read-all", "open-large-viewer", "raw", "demo", "defaults", "watch"}) {
-    EXPECT_NE(output().find(std::string("\n  ") + name + " "), std::string::npos) << name;
-    EXPECT_NE(output().find(std::string("lumeris ") + name), std::string::npos) << name;
-  }
-  for (const char* escape : {"$uint64", "$int64", "$double", "$data"}) {
-    EXPECT_NE(output().find(escape), std::string::npos) << escape;
-  }
+  EXPECT_NE(output().find("Exit status:\n  0  done\n  1  not done"), std::string::npos) << output();
 }
 
-TEST_F(CliCommandTest, DemoGoesOnWhenOperationsDoNotAnswer) {
+TEST_F(CliCommandTest, DemoGoesOnWhenOperationsDoNotAnswerAndCleansUp) {
   // Only the unknown search command answers, as a service with no operations installed does.
-  channel_.answer = ByCommand({{"search_", R"({"transactionID":7})"}});
+  channel_.replies = {{"search_", R"({"transactionID":7})"}};
   ASSERT_EQ(run({"demo"}), 0) << errors();
-  EXPECT_NE(output().find("The service answers."), std::string::npos) << output();
-  EXPECT_NE(output().find("no answer"), std::string::npos) << output();
-  // Everything the demo stores goes under its own identifier, and is removed at the end.
-  std::vector<const Sent*> writes;
+  EXPECT_NE(output().find("(no answer"), std::string::npos) << output();
+  // Everything the demo stores goes under its own identifier, and both lists are removed at the end.
   for (const Sent& sent : channel_.sent) {
     if (const std::string* identifier = sent.request.GetString("identifier")) {
       EXPECT_EQ(*identifier, kDemoIdentifier);
     }
-    if (!sent.wants_reply) writes.push_back(&sent);
   }
-  ASSERT_GE(writes.size(), 2u);
-  for (const Sent* removal : {writes[writes.size() - 2], writes.back()}) {
-    EXPECT_EQ(*removal->request.GetString("command"), "set");
-    EXPECT_EQ(removal->request.Find("array"), nullptr);
-  }
-}
-
-TEST_F(CliCommandTest, DemoShowsAnswersAndFailsOnlyWhenTheServiceIsUnreachable) {
-  channel_.answer = ByCommand({{"search_matched_chars", R"({"result":["😃"],"transactionID":0})"},
-                               {"read", R"({"array":[")" LMK R"(char\":\"A\"}"]})"},
-                               {"search_", R"({"transactionID":7})"}});
-  ASSERT_EQ(run({"demo"}), 0) << errors();
-  for (const char* shown : {"  😃\tU+1F603\n", "Related to a", "  A\tU+0041\n"}) {
-    EXPECT_NE(output().find(shown), std::string::npos) << output();
-  }
-  channel_.answer = [](const MessageValue&) { return std::nullopt; };
-  EXPECT_EQ(run({"demo"}), kExitNoAnswer);
-  EXPECT_NE(errors().find("lumeris: demo:"), std::string::npos) << errors();
+  ASSERT_GE(channel_.sent.size(), 2u);
+  EXPECT_EQ(channel_.sent[channel_.sent.size() - 2].request, Json(R"({"command":"set","target":"recents","identifier":")" +
+                                                                   std::string(kDemoIdentifier) + "\"}"));
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
-// JSON <-> message value conversion of `lumeris raw` and --json output: plain kinds, the typed
-// escapes, round trips, the inputs that must be refused, and the base64 under "$data".
+// The tagged JSON notation of `lumeris raw`, --json output and `lumeris defaults`: plain kinds,
+// the tags, round trips, the inputs that must be refused, and the byte texts.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -9,6 +9,7 @@
 
 #include "client/cli_base64.h"
 #include "client/cli_json_value.h"
+#include "client/property_list_json.h"
 
 namespace lumeris::cli {
 namespace {
@@ -30,12 +31,13 @@ TEST(JsonReadTest, ReadsTheKindTheTextAsksFor) {
         {"-9223372036854775808", V::Int64(INT64_MIN)}, {"5.0", V::Double(5.0)},
         {"1e3", V::Double(1000.0)}, {"\"😀\"", V::String("😀")},
         {R"({"$uint64": "18446744073709551615"})", V::Uint64(UINT64_MAX)},
-        {R"({"$uint64": 7})", V::Uint64(7)}, {R"({"$int64": "-1"})", V::Int64(-1)},
-        {R"({"$int64": "5"})", V::Int64(5)}, {R"({"$int64": -3})", V::Int64(-3)},
+        {R"({"$uint64": 7})", V::Uint64(7)}, {R"({"$int64": "5"})", V::Int64(5)}, {R"({"$int64": -3})", V::Int64(-3)},
         {R"({"$double": 5})", V::Double(5.0)}, {R"({"$double": "-inf"})", V::Double(-kInf)},
-        {R"({"$data": ""})", V::Data({})}, {R"({"$data": "AP8Q"})", V::Data({0x00, 0xFF, 0x10})},
+        {R"({"$base64": ""})", V::Data({})}, {R"({"$base64": "AP8Q"})", V::Data({0x00, 0xFF, 0x10})},
+        {R"({"$hex": "00fF10"})", V::Data({0x00, 0xFF, 0x10})},
+        // The older "$data": hexadecimal when it is hex digits, else base64.
+        {R"({"$data": "00ff"})", V::Data({0x00, 0xFF})}, {R"({"$data": "e30="})", V::Data({'{', '}'})},
         {R"({"$dictionary": {"$data": "x"}})", Dict({{"$data", V::String("x")}})},
-        {R"({"$a": 1, "$b": 2})", Dict({{"$a", V::Uint64(1)}, {"$b", V::Uint64(2)}})},
         {R"({"command": "set", "array": ["a", 1, null]})",
                  Dict({{"command", V::String("set")},
                        {"array", V::MakeArray({V::String("a"), V::Uint64(1), V::Null()})}})},
@@ -53,7 +55,8 @@ TEST(JsonRefusedTest, RefusesWithAReasonNamingTheMember) {
       {R"({"$uint64": "18446744073709551616"})", "$uint64"}, {R"({"$uint64": "5x"})", "$uint64"},
       {R"({"$uint64": ""})", "$uint64"}, {R"({"$int64": "9223372036854775808"})", "$int64"},
       {R"({"$int64": 9223372036854775808})", "$int64"}, {R"({"$double": "many"})", "$double"},
-      {R"({"$data": "AP8"})", "$data"}, {R"({"$data": 5})", "$data"}, {R"({"$dictionary": [1]})", "$dictionary"},
+      {R"({"$base64": "00f"})", "$base64"}, {R"({"$hex": "e30="})", "$hex"}, {R"({"$data": 5})", "$data"},
+      {R"({"$dictionary": [1]})", "$dictionary"}, {R"({"$date": "2024-05-01T12:00:00Z"})", "a date has no message form"},
       {R"({"$unit64": "5"})", "$unit64"}, {R"({"a": [0, {"limit": {"$uint64": "x"}}]})", "/a/1/limit/$uint64"},
   };
   for (const auto& [json, named_in_error] : cases) {
@@ -83,36 +86,55 @@ TEST(JsonRoundTripTest, PrintedValuesReadBackUnchanged) {
       EXPECT_EQ(*back, value) << text;
     }
   }
-  const std::string nan = JsonText(JsonFromMessageValue(V::Double(std::nan(""))), false);
-  std::optional<V> back = MessageValueFromJsonText(nan, nullptr);
-  ASSERT_TRUE(back && back->AsDouble()) << nan;
-  EXPECT_TRUE(std::isnan(*back->AsDouble()));
   // Invalid UTF-8 is replaced, not fatal.
   EXPECT_EQ(JsonText(JsonFromMessageValue(V::String("a\xFF" "b")), false), "\"a\xEF\xBF\xBD" "b\"");
 }
 
-// The test vectors of RFC 4648, section 10, then every byte value at several lengths.
-TEST(Base64Test, EncodesAndDecodes) {
+// `defaults write` takes back everything `defaults read` prints, in the same notation as `raw`.
+TEST(PropertyListJsonTest, PrintedValuesWriteBackAndOtherFormsAreRefusedWithTheReason) {
+  const plist::Value value = plist::Dictionary{
+      {"bytes", plist::Data{0, 0xFF}}, {"lone", plist::Dictionary{{"$data", "e30="}}}, {"nan", plist::Value(std::nan(""))},
+      {"max", plist::Value(INT64_MAX)}, {"date", plist::Date{60}}};
+  const nlohmann::json printed = PropertyListToJson(value);
+  EXPECT_EQ(printed["bytes"], nlohmann::json::parse(R"({"$base64":"AP8="})"));
+  std::string error;
+  const std::optional<plist::Value> back = PropertyListFromJson(nlohmann::json::parse(printed.dump()), &error);
+  ASSERT_TRUE(back) << error;
+  EXPECT_TRUE(back->Find("lone") && *back->Find("lone") == *value.Find("lone"));
+  EXPECT_TRUE(std::isnan(*back->Find("nan")->AsReal()));
+  EXPECT_TRUE(*back->Find("bytes") == *value.Find("bytes") && *back->Find("date") == *value.Find("date"));
+
+  std::string note;
+  EXPECT_TRUE(PropertyListFromJson(nlohmann::json::parse(R"({"$data":"e30="})"), &error, &note));
+  EXPECT_EQ(note, "");
+  EXPECT_TRUE(PropertyListFromJson(nlohmann::json::parse(R"({"$data":"00ff"})"), &error, &note));
+  EXPECT_EQ(note, "{\"$data\": \"00ff\"} was read as hexadecimal; write {\"$hex\": ...} or {\"$base64\": ...} to say "
+                  "which is meant");
+  for (const auto& [json, reason] : std::initializer_list<std::pair<const char*, const char*>>{
+           {"18446744073709551615",
+            "the value is outside the signed 64-bit range of a property-list integer (store it as text, or as a real "
+            "with --type real)"},
+           {R"([1, null])", "/1 is null, which has no property-list form"},
+           {R"({"a": {"$hexx": "00"}})", "/a/$hexx is not a known tag"}}) {
+    EXPECT_FALSE(PropertyListFromJson(nlohmann::json::parse(json), &error)) << json;
+    EXPECT_EQ(error.substr(0, std::string(reason).size()), reason) << json;
+  }
+}
+
+// The test vectors of RFC 4648, section 10, and text that is not base64 or hex.
+TEST(ByteTextTest, DecodesBase64AndHexAndRefusesMalformedText) {
   const std::pair<std::string, const char*> cases[] = {
-      {"", ""}, {"f", "Zg=="}, {"fo", "Zm8="}, {"foo", "Zm9v"}, {"foob", "Zm9vYg=="},
-      {"fooba", "Zm9vYmE="}, {"foobar", "Zm9vYmFy"}};
+      {"", ""}, {"f", "Zg=="}, {"fo", "Zm8="}, {"foo", "Zm9v"}, {"foob", "Zm9vYg=="}, {"fooba", "Zm9vYmE="}, {"foobar", "Zm9vYmFy"}};
   for (const auto& [text, encoded] : cases) {
     const std::vector<std::uint8_t> bytes(text.begin(), text.end());
     EXPECT_EQ(EncodeBase64(bytes), encoded);
     EXPECT_EQ(DecodeBase64(encoded), bytes) << encoded;
   }
-  std::vector<std::uint8_t> bytes;
-  for (int i = 0; i < 256; ++i) bytes.push_back(static_cast<std::uint8_t>(i));
-  for (std::size_t length = 0; length <= bytes.size(); length += 37) {
-    const std::vector<std::uint8_t> part(bytes.begin(), bytes.begin() + length);
-    EXPECT_EQ(DecodeBase64(EncodeBase64(part)), part) << length;
-  }
-}
-
-TEST(Base64Test, RefusesMalformedText) {
   for (const char* text : {"Zg", "Zg=", "Z===", "Zm9v!A==", "Zg==Zg==", "Zh==", "Zm9=", "=Zm9"}) {
     EXPECT_FALSE(DecodeBase64(text)) << text;
   }
+  EXPECT_EQ(DecodeHex("0aFF"), (std::vector<std::uint8_t>{0x0A, 0xFF}));
+  for (const char* text : {"0", "0g", "e30="}) EXPECT_FALSE(DecodeHex(text)) << text;
 }
 
 }  // namespace

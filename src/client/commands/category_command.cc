@@ -185,18 +185,18 @@ void ListAvailableCategories(CliSession& session, const CategoryOptions& options
   const std::optional<Bundle> application = OpenApplicationBundle();
   if (!application) {
     session.Complain("categories: no input-method bundle at " + SystemPath(kApplicationBundlePath).string());
-    ExitWith(kExitNoAnswer);
+    ExitWith(kExitFailure);
   }
   const std::vector<CategoryGroup> groups =
       ReadAvailableCategories(*application, PreferredLocalizationOfBundle(&*application));
   std::vector<std::string> names;
   for (const CategoryGroup& group : groups) names.insert(names.end(), group.categories.begin(), group.categories.end());
   if (names.empty()) {
-    session.PrintLines("", "no categories");
+    session.PrintLines("", "(none)");
     return;
   }
   std::optional<MessageValue> reply = AskForCategories(session, names);
-  if (!reply) ExitWith(kExitNoAnswer);
+  if (!reply) ExitWith(kExitFailure);
   const MessageValue* result = reply->Find("result");
   const MessageValue::Array* entries = result ? result->AsArray() : nullptr;
   const MessageValue none;
@@ -219,7 +219,7 @@ void ListAvailableCategories(CliSession& session, const CategoryOptions& options
   }
   std::optional<int> icons;
   if (!options.icons.empty() && !(icons = WriteIcons(session, options.icons, names, result))) {
-    ExitWith(kExitBadArgument);
+    ExitWith(kExitFailure);
   }
   if (session.json()) {
     session.PrintJson({{"groups", std::move(json_groups)}});
@@ -231,16 +231,16 @@ void ListAvailableCategories(CliSession& session, const CategoryOptions& options
 
 void ShowCategories(CliSession& session, const CategoryOptions& options) {
   std::optional<MessageValue> reply = AskForCategories(session, options.names);
-  if (!reply) ExitWith(kExitNoAnswer);
+  if (!reply) ExitWith(kExitFailure);
   std::optional<int> icons;
   if (!options.icons.empty() && !(icons = WriteIcons(session, options.icons, options.names, reply->Find("result")))) {
-    ExitWith(kExitBadArgument);
+    ExitWith(kExitFailure);
   }
   if (session.json()) {
     session.PrintJson(ReplyJson(*reply));
     return;
   }
-  session.PrintLines(FormatCategoryEntries(options.names, reply->Find("result")), "no categories");
+  session.PrintLines(FormatCategoryEntries(options.names, reply->Find("result")), "(none)");
   if (icons) session.out() << *icons << " icon files written to " << options.icons << "\n";
 }
 
@@ -291,7 +291,10 @@ void AddCategoryCommand(CLI::App& app, CliSession& session) {
       "categories", "Titles, icons and characters of the categories NAME... (none: list them all)");
   sub->add_option("names", options->names, "category names, e.g. Emoji Arrows");
   sub->add_option("--icons", options->icons, "write each icon file into DIR")->type_name("DIR");
-  sub->footer("Examples: lumeris categories    lumeris categories Emoji Arrows --icons /tmp/icons");
+  sub->footer(
+      "Examples:\n"
+      "  lumeris categories\n"
+      "  lumeris categories Emoji Arrows --icons /tmp/icons");
   sub->callback([&session, options] {
     if (options->names.empty()) {
       ListAvailableCategories(session, *options);

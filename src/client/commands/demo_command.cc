@@ -33,7 +33,7 @@ class Tour {
       return reply;
     }
     const std::string text = format(*reply);
-    if (text.empty()) session_.out() << "  (nothing)\n";
+    if (text.empty()) session_.out() << "  (none)\n";
     std::size_t start = 0;
     while (start < text.size()) {
       const std::size_t end = text.find('\n', start);
@@ -71,7 +71,7 @@ int RunDemo(CliSession& session) {
   // An unknown search sub-command is always answered: it shows the service is there.
   MessageValue ping = CommandRequest("search_");
   ping.Set("transactionID", MessageValue::Uint64(7));
-  if (!session.Ask("demo", ping)) return kExitNoAnswer;
+  if (!session.Ask("demo", ping)) return kExitFailure;
   session.out() << "The service answers.\n\n";
 
   Tour tour(session);
@@ -114,7 +114,7 @@ int RunDemo(CliSession& session) {
   skin_tone.Set("item", MessageValue::String(EntityIDForItem("👍🏽", emoji)));
   if (!session.Tell("demo", add) || !session.Tell("demo", add_second) ||
       !session.Tell("demo", favorites) || !session.Tell("demo", skin_tone)) {
-    return kExitNoAnswer;
+    return kExitFailure;
   }
   const auto items = [](const MessageValue& reply) { return FormatItems(reply.Find("array")); };
   tour.Show("Recents after adding 😀 and A:", ListRequest("read", "recents"), items);
@@ -128,7 +128,7 @@ int RunDemo(CliSession& session) {
   // Setting no list removes it, and an empty recents list takes the skin tones with it.
   if (!session.Tell("demo", ListRequest("set", "recents")) ||
       !session.Tell("demo", ListRequest("set", "favorites"))) {
-    return kExitNoAnswer;
+    return kExitFailure;
   }
   session.out() << "\nThe demo's entries are removed again.\n";
   return 0;

@@ -23,25 +23,29 @@ void AddRawCommand(CLI::App& app, CliSession& session) {
                 "send it as a message that wants no reply (for set, add, set_skintone, "
                 "save_state and unknown commands)");
   raw->footer(
-      "Typed values where JSON cannot tell: {\"$uint64\": \"5\"}, {\"$int64\": \"-1\"}, "
-      "{\"$double\": 5}, {\"$data\": \"<base64>\"}; null is JSON null; "
-      "{\"$dictionary\": {...}} keeps a literal key that begins with \"$\".\n"
-      "Example: lumeris raw '{\"command\":\"read\",\"target\":\"recents\","
-      "\"identifier\":\"com.vantorel.Lumeris.DefaultDataStorage\"}'");
+      "Tags give the kinds JSON cannot tell apart: {\"$uint64\": \"5\"}, {\"$int64\": \"-1\"}, "
+      "{\"$double\": \"nan\"}, bytes as {\"$base64\": \"AP8=\"} or {\"$hex\": \"00ff\"}; "
+      "{\"$dictionary\": {...}} keeps a literal key that begins with \"$\". Replies print the same way.\n"
+      "Examples:\n"
+      "  lumeris raw '{\"command\":\"search_matched_chars\",\"string\":\"cat\",\"limit\":{\"$uint64\":\"5\"}}'\n"
+      "  lumeris raw --no-reply '{\"command\":\"save_state\",\"application\":\"x\",\"data\":{\"$base64\":\"e30=\"}}'");
   raw->callback([&session, options] {
     std::string error;
-    std::optional<MessageValue> request = MessageValueFromJsonText(options->json, &error);
+    std::string note;
+    std::optional<MessageValue> request = MessageValueFromJsonText(options->json, &error, &note);
     if (request && !request->is_dictionary()) {
       request.reset();
       error = "the request must be a JSON object";
     }
-    if (!request) {
-      session.Complain("raw: " + error);
-      ExitWith(kExitBadArgument);
-    }
+    if (!request) session.Refuse("raw", error);
+    if (!note.empty()) session.Complain("raw: warning: " + note);
     if (options->no_reply) {
-      if (!session.Tell("raw", *request)) ExitWith(kExitNoAnswer);
-      if (!session.json()) session.out() << "sent\n";
+      if (!session.Tell("raw", *request)) ExitWith(kExitFailure);
+      if (session.json()) {
+        session.PrintJson({{"sent", JsonFromMessageValue(*request)}});
+      } else {
+        session.out() << "raw: sent; the service has handled it (such messages get no reply)\n";
+      }
       return;
     }
     std::optional<MessageValue> reply = session.Ask("raw", *request);
@@ -49,7 +53,7 @@ void AddRawCommand(CLI::App& app, CliSession& session) {
       session.Complain(
           "raw: commands that never answer (set, add, set_skintone, save_state, unknown ones) "
           "are sent with --no-reply");
-      ExitWith(kExitNoAnswer);
+      ExitWith(kExitFailure);
     }
     session.out() << JsonText(JsonFromMessageValue(*reply), !session.json()) << '\n';
   });

@@ -75,14 +75,14 @@ constexpr CharacterQuery kCharacterQueries[] = {
     {"search", "search_matched_chars",
      "Characters whose name contains TEXT, with code points and names", "text",
      "the text to look for in character names", true, "lumeris search 'smiling face' --limit 5",
-     &FormatFoundCharacters, "no characters found"},
-    {"related", "search_related_chars", "Characters related to CHAR, with code points and names",
+     &FormatFoundCharacters, "(none)"},
+    {"related", "search_related_chars", "Characters related to CHARACTER, with code points and names",
      "character", "the character", true, "lumeris related 中 --limit 10", &FormatFoundCharacters,
-     "no related characters"},
+     "(none)"},
     {"info", "search_character_info",
-     "The sixteen information fields of CHAR, in field order, with what each holds", "character",
+     "The sixteen information fields of CHARACTER, in field order, with what each holds", "character",
      "the character", false, "lumeris info 中", &FormatInformation,
-     "no information about this character"},
+     "(none)"},
 };
 
 void AddCharacterQuery(CLI::App& app, CliSession& session, const CharacterQuery& query) {
@@ -99,7 +99,7 @@ void AddCharacterQuery(CLI::App& app, CliSession& session, const CharacterQuery&
   sub->callback([&session, options, &query] {
     std::optional<MessageValue> reply =
         session.Ask(query.name, SearchRequest(query.command, *options, query.has_limit));
-    if (!reply) ExitWith(kExitNoAnswer);
+    if (!reply) ExitWith(kExitFailure);
     if (session.json()) {
       session.PrintJson(ReplyJson(*reply));
     } else {
