@@ -137,10 +137,7 @@ TEST(OldStyleLocalizationTest, NamesAndCodesMapBothWaysAndNothingElseIsOldStyle)
 }
 
 TEST(PreferredLocalizationsFromArrayTest, MatchesWithIcu) {
-  const struct {
-    const char* what;
-    Strings localizations, preferences, expected;
-  } cases[] = {
+  const struct { const char* what; Strings localizations, preferences, expected; } cases[] = {
       {"script variants and old-style names", {"English", "de", "zh-Hant"}, {"zh-TW", "en-GB"}, {"zh-Hant", "English"}},
       {"simplified Chinese is not traditional", {"zh-Hans", "zh-Hant"}, {"zh-CN"}, {"zh-Hans"}},
       {"one entry per localization, preference order", {"en", "de", "fr"}, {"de-CH", "fr-CA", "de-AT"}, {"de", "fr"}},

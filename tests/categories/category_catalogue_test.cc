@@ -112,10 +112,7 @@ TEST_F(CategoryCatalogueTest, EmptyOrAbsentNameListsGiveAnEmptyArray) {
 }
 
 TEST_F(CategoryCatalogueTest, OrdinaryCategoriesJoinTheirSegments) {
-  const struct {
-    const char* name;
-    MessageValue expected;
-  } cases[] = {
+  const struct { const char* name; MessageValue expected; } cases[] = {
       {"Three", Dict({{"Data", Str("0041,0043")}, {"TitleText", Str("Three")},
                       {"TitleImage", Bytes("app CategoryImage-Three.pdf")}})},
       {"GapFirst", Dict({{"Data", Str("0042")}, {"TitleText", Str("GapFirst")}, {"TitleImage", Bytes("")}})},
@@ -162,11 +159,7 @@ TEST_F(CategoryCatalogueTest, EmojiSubcategoriesTakeTitlesIconsAndPrefixedData) 
 }
 
 TEST_F(CategoryCatalogueTest, OneLocalizationFromTheUsersLanguagesServesTitlesAndPlists) {
-  const struct {
-    const char* what;
-    std::map<std::string, std::optional<std::string>> env;
-    bool german;
-  } cases[] = {
+  const struct { const char* what; std::map<std::string, std::optional<std::string>> env; bool german; } cases[] = {
       {"LANGUAGE", {{"LANGUAGE", "it:de"}}, true},
       {"LANG", {{"LANG", "de_CH.UTF-8"}}, true},
       {"no localization matches: English", {{"LANGUAGE", "ja"}, {"LANG", "de_DE.UTF-8"}}, false},

@@ -125,10 +125,7 @@ TEST_P(CharacterDatabaseTest, SearchRules) {
   });
   emoji_ = {"❤\uFE0F", "💙"};
   undrawable_ = {"☐"};
-  const struct {
-    const char* text;
-    Strings expected;
-  } kCases[] = {
+  const struct { const char* text; Strings expected; } kCases[] = {
       {"heart", {"❤\uFE0F", "💙", "♡"}},  // emoji first, one result per row and field
       {"HeArT", {"❤\uFE0F", "💙", "♡"}},
       {"alef", {"ℵ"}},
@@ -168,11 +165,7 @@ TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest
 TEST_P(CharacterDatabaseTest, RelatedCharacters) {
   WriteRelated({"aAáÀ", "a", "xyz", "👍👍🏽", "👍🏽👍🏿", "%q", "b_"});
   undrawable_ = {"À"};
-  const struct {
-    const char* text;
-    std::uint64_t limit;
-    Strings expected;
-  } kCases[] = {
+  const struct { const char* text; std::uint64_t limit; Strings expected; } kCases[] = {
       {"a", 10, {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
       {"A", 10, {"a", "á", "a"}},
       {"a", 1, {"A"}},

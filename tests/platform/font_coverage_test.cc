@@ -13,11 +13,7 @@ namespace {
 
 TEST(FontCoverageTest, EmojiFontAndDefaultLikeFont) {
   ASSERT_TRUE(LoadLumerisFontConfiguration());
-  const struct {
-    const char* text;
-    bool emoji_font;
-    bool default_like;
-  } kCases[] = {
+  const struct { const char* text; bool emoji_font; bool default_like; } kCases[] = {
       {"😀", true, true},
       {"❤", true, true},
       {"❤\uFE0F", true, true},  // U+FE0F has no glyph, yet the pair is drawn

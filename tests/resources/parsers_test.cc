@@ -283,10 +283,7 @@ class CharacterRowsTest : public ::testing::Test {
 TEST_F(CharacterRowsTest, EachHanFieldComesFromItsOwnUnihanProperty) {
   const auto built = Rows();
   const std::map<std::string, std::string> rows(built.begin(), built.end());
-  const struct {
-    const char* tag;
-    const char* value;
-  } kFields[] = {
+  const struct { const char* tag; const char* value; } kFields[] = {
       {"unam", "CJK UNIFIED IDEOGRAPH-4E01; nail"},  // derived name; kDefinition
       {"jyom", "TEI; HINOTO"},                       // kJapaneseOn; kJapaneseKun
       {"krpi", "정; CENG"},                          // kHangul without its source tag; kKorean

@@ -62,10 +62,7 @@ TEST(IsValidEmojiScalarForVariant, AcceptsExactlyTheTableEntries) {
 
 TEST(CompareEmojiStrings, IgnoresOnlyWhatTheFlagsAllow) {
   const icu::UnicodeString none;
-  const struct {
-    icu::UnicodeString a, b;
-    bool selectors_significant, skin_tones_significant, expected;
-  } cases[] = {
+  const struct { icu::UnicodeString a, b; bool selectors_significant, skin_tones_significant, expected; } cases[] = {
       {Scalars({0x1F44D, 0x1F3FB}), Scalars({0x1F44D}), true, false, true},
       {Scalars({0x1F44D, 0x1F3FB}), Scalars({0x1F44D}), true, true, false},
       {Scalars({0x1F44D, 0x1F3FB}), Scalars({0x1F44D}), false, true, false},
