@@ -33,18 +33,15 @@ std::string Info(const std::string& unam, const std::string& later = "") {
 
 // Writes `table` with the columns `columns` and rows of two texts each.
 void WriteTable(const std::filesystem::path& path, const std::string& table, const std::string& columns, const Rows& rows) {
+  std::string sql = "create table " + table + " (" + columns + ");";
+  for (const auto& [first, second] : rows) {
+    char* insert = sqlite3_mprintf("insert into %s values (%Q, %Q);", table.c_str(), first.c_str(), second.c_str());
+    sql += insert;
+    sqlite3_free(insert);
+  }
   sqlite3* db = nullptr;
   ASSERT_EQ(sqlite3_open(path.c_str(), &db), SQLITE_OK);
-  ASSERT_EQ(sqlite3_exec(db, ("create table " + table + " (" + columns + ")").c_str(), nullptr, nullptr, nullptr), SQLITE_OK);
-  sqlite3_stmt* insert = nullptr;
-  ASSERT_EQ(sqlite3_prepare_v2(db, ("insert into " + table + " values (?, ?)").c_str(), -1, &insert, nullptr), SQLITE_OK);
-  for (const auto& [first, second] : rows) {
-    sqlite3_bind_text(insert, 1, first.data(), static_cast<int>(first.size()), SQLITE_TRANSIENT);
-    sqlite3_bind_text(insert, 2, second.data(), static_cast<int>(second.size()), SQLITE_TRANSIENT);
-    EXPECT_EQ(sqlite3_step(insert), SQLITE_DONE);
-    sqlite3_reset(insert);
-  }
-  sqlite3_finalize(insert);
+  EXPECT_EQ(sqlite3_exec(db, sql.c_str(), nullptr, nullptr, nullptr), SQLITE_OK);
   sqlite3_close(db);
 }
 

@@ -73,10 +73,8 @@ TEST(CompareEmojiStrings, IgnoresOnlyWhatTheFlagsAllow) {
       {Scalars({0x2764, 0xFE00}), Scalars({0x2764}), false, false, false},
       {Scalars({0x1F468, 0x200D, 0x1F466}), Scalars({0x1F468, 0x1F466}), false, false, false},
       {Scalars({0x1F44D, 0x1F3FB, 0xFE0F}), Scalars({0x1F44D}), false, false, true},
-      {Scalars({0x1F3FB}), none, true, false, true},
-      {none, none, false, false, true},
-      {none, none, true, true, true},
-      {Scalars({0x41}), Scalars({0x42}), false, false, false},
+      {Scalars({0x1F3FB}), none, true, false, true}, {none, none, false, false, true},
+      {none, none, true, true, true}, {Scalars({0x41}), Scalars({0x42}), false, false, false},
       {Units({0xD83D}), Units({0xD83D}), false, false, true},
       {Units({0xD83D}), Units({0xD83C}), false, false, false}};
   for (const auto& c : cases) {
