@@ -79,7 +79,7 @@ class WindowTest : public ::testing::Test {
 // The 40 x 30 test window's pixels: red grows to the right, green downwards.
 uint32_t Pattern(int x, int y) { return 0xFF000000u | uint32_t(x * 6) << 16 | uint32_t(y * 8) << 8 | 0x40u; }
 
-TEST_F(WindowTest, CapturesTheWholeWindowOrAPartOfIt) {
+TEST_F(WindowTest, CapturesTheWholeWindowOrAPartOfItOverWhite) {
   std::vector<uint32_t> pixels;
   for (int i = 0; i < 40 * 30; ++i) pixels.push_back(Pattern(i % 40, i / 40));
   // One window where no other test draws, one hanging over the screen's bottom-right corner, of
@@ -122,13 +122,12 @@ TEST_F(WindowTest, CapturesTheWholeWindowOrAPartOfIt) {
   EXPECT_EQ(CacheWindowContentsImage(x_, unmapped, {}), nullptr);
   xcb_destroy_window(x_, unmapped);
   EXPECT_EQ(CacheWindowContentsImage(x_, unmapped, {}), nullptr);
-}
 
-TEST_F(WindowTest, TransparentPartsOfAnAlphaWindowComeOutWhite) {
-  // Premultiplied: transparent, half-covering red, opaque blue, half-covering grey.
-  const xcb_window_t window = Shown(1000, 700, 4, 1, {0x00000000, 0x80800000, 0xFF0000FF, 0x80404040}, /*argb=*/true);
-  ASSERT_NE(window, XCB_NONE) << "the X server has no 32-bit visual";
-  cairo_surface_t* picture = CacheWindowContentsImage(x_, window, {});
+  // The transparent parts of an alpha window come out white. Premultiplied: transparent,
+  // half-covering red, opaque blue, half-covering grey.
+  const xcb_window_t alpha = Shown(1000, 700, 4, 1, {0x00000000, 0x80800000, 0xFF0000FF, 0x80404040}, /*argb=*/true);
+  ASSERT_NE(alpha, XCB_NONE) << "the X server has no 32-bit visual";
+  cairo_surface_t* picture = CacheWindowContentsImage(x_, alpha, {});
   ASSERT_NE(picture, nullptr);
   const uint32_t kExpected[] = {0xFFFFFFFF, 0xFFFF7F7F, 0xFF0000FF, 0xFFBFBFBF};
   for (int x = 0; x < 4; ++x) EXPECT_EQ(PixelAt(picture, x, 0), kExpected[x]) << "x = " << x;
