@@ -98,17 +98,14 @@ TEST_F(BuiltBundleTest, OneRowOfSixteenFieldsPerAssignedCodePointAndPlainEmojiSe
             "uchr");
 }
 
-// The input files whose texts the database end-to-end record of 中 and 👍🏽 does not show reach the
-// records: NameAliases, the derived English CLDR file and the emoji test file.
-TEST_F(BuiltBundleTest, RecordsHoldTheTextsOfEveryInputFile) {
+// The records hold the texts of the input files the database end-to-end record of 中 and 👍🏽 does
+// not show (NameAliases, the derived English CLDR file, the emoji test file). Search walks the
+// rows in stored order, so the emoji a word names comes before those that only mention it; every
+// lone emoji with a tone finds the record of its toneless key.
+TEST_F(BuiltBundleTest, RecordsHoldEveryInputFileNamedEmojiComeFirstAndTonedFormsHaveRecords) {
   const std::pair<const char*, const char*> kNames[] = {{"\u00A0", "NBSP"}, {"🇩🇪", "flag: Germany"},
                                                         {"👩‍❤️‍👨", "couple with heart: woman, man; couple; couple with heart; love"}};
   for (const auto& [character, text] : kNames) EXPECT_THAT(Field(character, "unam"), HasSubstr(text)) << character;
-}
-
-// Search walks the rows in stored order, so the emoji a word names comes before those that only
-// mention it; every lone emoji with a tone finds the record of its toneless key.
-TEST_F(BuiltBundleTest, NamedEmojiComeFirstAndTonedFormsHaveRecords) {
   const auto row = [](const char* character) { return std::stol(Query("select rowid from unihan_dict where uchr = ?", character)); };
   const std::pair<const char*, const char*> kBefore[] = {
       {"🔥", "❤️‍🔥"}, {"🔥", "🧑‍🚒"}, {"❤️", "🥰"}, {"⭐", "🤩"}, {"🚀", "🧑‍🚀"}, {"☀️", "😎"},
