@@ -76,7 +76,7 @@ TEST(HangulNameTest, FollowsTheUnicodeAlgorithm) {
   for (const auto& [cp, name] : kNames) EXPECT_EQ(HangulSyllableName(cp).value_or("<none>"), name) << std::hex << +cp;
 }
 
-TEST(UcdFormatTest, RangesSequencesAndAliases) {
+TEST(UcdFormatTest, RangesSequencesAliasesAndUnihanValues) {
   std::vector<std::tuple<char32_t, char32_t, std::string>> ranges;
   for (const CodePointRange& r : ParseCodePointRanges("# comment\n0000..007F; Basic Latin\n\n00AA ; Latin # Lo FEMININE\n"
                                                       "ZZZZ..0001; Bad\n0010..0005; Backwards\n")) {
@@ -89,9 +89,7 @@ TEST(UcdFormatTest, RangesSequencesAndAliases) {
   ASSERT_EQ(aliases[0].size(), 2u);
   EXPECT_EQ(aliases[0][1].alias + " " + aliases[0][1].type, "NUL abbreviation");  // file order per code point
   EXPECT_EQ(aliases[0x1A2][0].type, "correction");
-}
-
-TEST(UnihanTest, VariantValuesDropSourceAnnotations) {
+  // Unihan variant values drop their source annotations.
   EXPECT_EQ(ParseUnihanCodePoints("U+53D1<kMatthews,kMeyerWempe U+5F42 junk"), (std::vector<char32_t>{0x53D1, 0x5F42}));
   EXPECT_TRUE(ParseUnihanCodePoints("").empty());
 }
