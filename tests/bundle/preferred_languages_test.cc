@@ -26,58 +26,35 @@ TEST(LanguageTagFromPosixLocaleTest, ConvertsToLanguageTagOrNothing) {
   for (const auto& [posix, tag] : cases) EXPECT_EQ(LanguageTagFromPosixLocale(posix), tag) << '"' << posix << '"';
 }
 
-// The four variables, in the order LANGUAGE, LC_ALL, LC_MESSAGES, LANG.
-struct Environment {
-  Maybe language, lc_all, lc_messages, lang;
-  void ApplyTo(ScopedEnv& env) const {
-    env.Set("LANGUAGE", language);
-    env.Set("LC_ALL", lc_all);
-    env.Set("LC_MESSAGES", lc_messages);
-    env.Set("LANG", lang);
-  }
-};
 constexpr std::nullopt_t none = std::nullopt;
 
-TEST(PreferredLanguagesTest, ReadsTheEnvironment) {
+// The user's languages and the locale's country from the same four variables.
+TEST(PreferredLanguagesTest, ReadTheEnvironment) {
   const struct {
     const char* what;
-    Environment environment;
+    Maybe language, lc_all, lc_messages, lang;
     std::vector<std::string> languages;
-  } cases[] = {
-      {"LANGUAGE list wins, duplicates dropped", {"de_CH:fr:de_CH", none, none, "en_US.UTF-8"}, {"de-CH", "fr"}},
-      {"unusable LANGUAGE entries are skipped", {"C::sv_SE", none, none, "en_US"}, {"sv-SE"}},
-      {"LANGUAGE with nothing usable falls back", {"C", none, none, "fr_FR"}, {"fr-FR"}},
-      {"empty LANGUAGE falls back", {"", none, none, "fr_FR"}, {"fr-FR"}},
-      {"LC_ALL before LC_MESSAGES and LANG", {none, "ja_JP.UTF-8", "ko_KR", "en_US"}, {"ja-JP"}},
-      {"LC_MESSAGES before LANG", {none, none, "ko_KR", "en_US"}, {"ko-KR"}},
-      {"empty LC_ALL does not count", {none, "", none, "it_IT"}, {"it-IT"}},
-      {"LC_ALL=C means none", {none, "C", none, "de_DE"}, {}},
-      {"nothing set", {none, none, none, none}, {}},
-  };
-  for (const auto& c : cases) {
-    ScopedEnv env;
-    c.environment.ApplyTo(env);
-    EXPECT_EQ(PreferredLanguages(), c.languages) << c.what;
-  }
-}
-
-TEST(CurrentLocaleCountryCodeTest, ReadsTheLocale) {
-  const struct {
-    const char* what;
-    Environment environment;
     Maybe country;
   } cases[] = {
-      {"LANG", {none, none, none, "de_CH.UTF-8"}, "CH"},
-      {"LC_ALL first", {none, "es_419", none, "en_US"}, "419"},
-      {"LC_MESSAGES before LANG", {none, none, "pt_BR", "en_US"}, "BR"},
-      {"script modifier keeps the region", {none, none, none, "sr_RS@latin"}, "RS"},
-      {"language without region", {none, none, none, "de"}, none},
-      {"LANGUAGE is not a locale", {"fr_FR", none, none, none}, none},
-      {"C locale", {none, "C", none, "de_DE"}, none},
+      {"LANGUAGE list wins, duplicates dropped, not a locale", "de_CH:fr:de_CH", none, none, "en_US.UTF-8", {"de-CH", "fr"}, "US"},
+      {"unusable LANGUAGE entries are skipped", "C::sv_SE", none, none, "en_US", {"sv-SE"}, "US"},
+      {"LANGUAGE with nothing usable falls back", "C", none, none, "fr_FR", {"fr-FR"}, "FR"},
+      {"empty LANGUAGE falls back", "", none, none, "fr_FR", {"fr-FR"}, "FR"},
+      {"LC_ALL before LC_MESSAGES and LANG", none, "es_419", "ko_KR", "en_US", {"es-419"}, "419"},
+      {"LC_MESSAGES before LANG", none, none, "ko_KR", "en_US", {"ko-KR"}, "KR"},
+      {"empty LC_ALL does not count", none, "", none, "it_IT", {"it-IT"}, "IT"},
+      {"a script modifier keeps the region", none, none, none, "sr_RS@latin", {"sr-Latn-RS"}, "RS"},
+      {"language without region", none, none, none, "de", {"de"}, none},
+      {"LC_ALL=C means none", none, "C", none, "de_DE", {}, none},
+      {"nothing set", none, none, none, none, {}, none},
   };
   for (const auto& c : cases) {
     ScopedEnv env;
-    c.environment.ApplyTo(env);
+    env.Set("LANGUAGE", c.language);
+    env.Set("LC_ALL", c.lc_all);
+    env.Set("LC_MESSAGES", c.lc_messages);
+    env.Set("LANG", c.lang);
+    EXPECT_EQ(PreferredLanguages(), c.languages) << c.what;
     EXPECT_EQ(CurrentLocaleCountryCode(), c.country) << c.what;
   }
 }

@@ -106,16 +106,9 @@ class CategoryCatalogueTest : public ::testing::Test {
   BundleWriter framework_;
 };
 
-TEST_F(CategoryCatalogueTest, EmptyOrAbsentNameListsGiveAnEmptyArray) {
-  EXPECT_EQ(CreateXPCCategoryDataArray(std::nullopt), MessageValue::MakeArray());
-  EXPECT_EQ(CreateXPCCategoryDataArray(Names{}), MessageValue::MakeArray());
-}
-
+// An empty or absent list of names gives an empty array.
 TEST_F(CategoryCatalogueTest, OrdinaryCategoriesJoinTheirSegments) {
-  const struct {
-    const char* name;
-    MessageValue expected;
-  } cases[] = {
+  const struct { const char* name; MessageValue expected; } cases[] = {
       {"Three", Dict({{"Data", Str("0041,0043")}, {"TitleText", Str("Three")},
                       {"TitleImage", Bytes("app CategoryImage-Three.pdf")}})},
       {"GapFirst", Dict({{"Data", Str("0042")}, {"TitleText", Str("GapFirst")}, {"TitleImage", Bytes("")}})},
@@ -129,6 +122,8 @@ TEST_F(CategoryCatalogueTest, OrdinaryCategoriesJoinTheirSegments) {
       {"../Category-Single", Dict({{"TitleText", Str("../Category-Single")}, {"TitleImage", Bytes("")}})},
   };
   for (const auto& c : cases) EXPECT_EQ(Entry(c.name), c.expected) << c.name;
+  EXPECT_EQ(CreateXPCCategoryDataArray(std::nullopt), MessageValue::MakeArray());
+  EXPECT_EQ(CreateXPCCategoryDataArray(Names{}), MessageValue::MakeArray());
 }
 
 TEST_F(CategoryCatalogueTest, EmojiSubcategoriesTakeTitlesIconsAndPrefixedData) {
@@ -161,30 +156,23 @@ TEST_F(CategoryCatalogueTest, EmojiSubcategoriesTakeTitlesIconsAndPrefixedData) 
                                   {"TitleImage", Bytes("app CategoryImage-Emoji.pdf")}}));
 }
 
+// The titles and data of "Local", the title of "Emoji" and of its first sub-category, the title
+// of "Single": a title missing from the German table falls back to the name, not to English.
 TEST_F(CategoryCatalogueTest, OneLocalizationFromTheUsersLanguagesServesTitlesAndPlists) {
-  const struct {
-    const char* what;
-    std::map<std::string, std::optional<std::string>> env;
-    bool german;
-  } cases[] = {
-      {"LANGUAGE", {{"LANGUAGE", "it:de"}}, true},
-      {"LANG", {{"LANG", "de_CH.UTF-8"}}, true},
-      {"no localization matches: English", {{"LANGUAGE", "ja"}, {"LANG", "de_DE.UTF-8"}}, false},
+  const Names german = {"Lokal", "0064", "Emoji (de)", "Smileys (de)", "Single"};
+  const struct { const char* what; std::optional<std::string> language, lang; Names expected; } cases[] = {
+      {"LANGUAGE", "it:de", std::nullopt, german},
+      {"LANG", std::nullopt, "de_CH.UTF-8", german},
+      {"no localization matches: English", "ja", "de_DE.UTF-8", {"Local (en)", "0065", "Emoji (en)", "Smileys (en)", "Single (en)"}},
   };
   for (const auto& c : cases) {
     testing::ScopedEnv env;
-    for (const char* name : {"LANGUAGE", "LC_ALL", "LC_MESSAGES", "LANG"}) {
-      env.Set(name, c.env.count(name) ? c.env.at(name) : std::nullopt);
-    }
+    testing::SetUserLanguages(env, c.language, c.lang);
     const MessageValue result = Request({"Local", "Emoji", "Single"});
-    const MessageValue::Array& entries = *result.AsArray();
-    EXPECT_EQ(*entries[0].GetString("TitleText"), c.german ? "Lokal" : "Local (en)") << c.what;
-    EXPECT_EQ(*entries[0].GetString("Data"), c.german ? "0064" : "0065") << c.what;
-    EXPECT_EQ(*entries[1].GetString("TitleText"), c.german ? "Emoji (de)" : "Emoji (en)") << c.what;
-    EXPECT_EQ(*entries[1].Find("Data")->AsArray()->front().GetString("TitleText"),
-              c.german ? "Smileys (de)" : "Smileys (en)") << c.what;
-    // A title missing from the German table falls back to the name, not to English.
-    EXPECT_EQ(*entries[2].GetString("TitleText"), c.german ? "Single" : "Single (en)") << c.what;
+    const MessageValue::Array& e = *result.AsArray();
+    EXPECT_EQ((Names{*e[0].GetString("TitleText"), *e[0].GetString("Data"), *e[1].GetString("TitleText"),
+                     *e[1].Find("Data")->AsArray()->front().GetString("TitleText"), *e[2].GetString("TitleText")}),
+              c.expected) << c.what;
   }
 }
 

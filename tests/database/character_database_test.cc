@@ -33,18 +33,15 @@ std::string Info(const std::string& unam, const std::string& later = "") {
 
 // Writes `table` with the columns `columns` and rows of two texts each.
 void WriteTable(const std::filesystem::path& path, const std::string& table, const std::string& columns, const Rows& rows) {
+  std::string sql = "create table " + table + " (" + columns + ");";
+  for (const auto& [first, second] : rows) {
+    char* insert = sqlite3_mprintf("insert into %s values (%Q, %Q);", table.c_str(), first.c_str(), second.c_str());
+    sql += insert;
+    sqlite3_free(insert);
+  }
   sqlite3* db = nullptr;
   ASSERT_EQ(sqlite3_open(path.c_str(), &db), SQLITE_OK);
-  ASSERT_EQ(sqlite3_exec(db, ("create table " + table + " (" + columns + ")").c_str(), nullptr, nullptr, nullptr), SQLITE_OK);
-  sqlite3_stmt* insert = nullptr;
-  ASSERT_EQ(sqlite3_prepare_v2(db, ("insert into " + table + " values (?, ?)").c_str(), -1, &insert, nullptr), SQLITE_OK);
-  for (const auto& [first, second] : rows) {
-    sqlite3_bind_text(insert, 1, first.data(), static_cast<int>(first.size()), SQLITE_TRANSIENT);
-    sqlite3_bind_text(insert, 2, second.data(), static_cast<int>(second.size()), SQLITE_TRANSIENT);
-    EXPECT_EQ(sqlite3_step(insert), SQLITE_DONE);
-    sqlite3_reset(insert);
-  }
-  sqlite3_finalize(insert);
+  EXPECT_EQ(sqlite3_exec(db, sql.c_str(), nullptr, nullptr, nullptr), SQLITE_OK);
   sqlite3_close(db);
 }
 
@@ -102,49 +99,28 @@ class CharacterDatabaseTest : public ::testing::TestWithParam<LMCharacterDatabas
 
 TEST_P(CharacterDatabaseTest, SearchRules) {
   WriteCharacters({
-      {"♡", Info("white heart suit")},
-      {"❤\uFE0F", Info("red heart; heart; HEART")},
-      {"💙", Info("blue heart")},
+      {"♡", Info("white heart suit")}, {"❤\uFE0F", Info("red heart; heart; HEART")}, {"💙", Info("blue heart")},
       {"ℵ", Info("alef", "heart")},   // only a later field holds the text
       {"ﬀ", Info("ﬀﬀﬀﬀﬀﬀﬀﬀﬀﬀ oak")},  // folding doubles field 0's length before the match
       {"É", Info("ÉCLAIR")},
       {"Ω", Info("ÉTÉ", "été")},  // LIKE passes on field 1, the second search on field 0
-      {"ß", Info("Straße")},
-      {"1", Info("100% sure")},
-      {"2", Info("100 percent")},
-      {"3", Info("a_b")},
-      {"4", Info("axb")},
-      {"5", Info("it's")},
-      {" ", Info("space mark")},
-      {"\u200B", Info("zero width mark")},
-      {"\x01", Info("control mark")},
-      {"", Info("empty mark")},
-      {"\xff", Info("broken mark")},
-      {"☐", Info("undrawable mark")},
-      {"✓", Info("drawable mark")},
+      {"ß", Info("Straße")}, {"1", Info("100% sure")}, {"2", Info("100 percent")}, {"3", Info("a_b")},
+      {"4", Info("axb")}, {"5", Info("it's")}, {" ", Info("space mark")}, {"\u200B", Info("zero width mark")},
+      {"\x01", Info("control mark")}, {"", Info("empty mark")}, {"\xff", Info("broken mark")},
+      {"☐", Info("undrawable mark")}, {"✓", Info("drawable mark")},
   });
   emoji_ = {"❤\uFE0F", "💙"};
   undrawable_ = {"☐"};
-  const struct {
-    const char* text;
-    Strings expected;
-  } kCases[] = {
+  const struct { const char* text; Strings expected; } kCases[] = {
       {"heart", {"❤\uFE0F", "💙", "♡"}},  // emoji first, one result per row and field
-      {"HeArT", {"❤\uFE0F", "💙", "♡"}},
-      {"alef", {"ℵ"}},
-      {"oak", {"ﬀ"}},
-      {"OAK", {"ﬀ"}},
+      {"HeArT", {"❤\uFE0F", "💙", "♡"}}, {"alef", {"ℵ"}}, {"oak", {"ﬀ"}}, {"OAK", {"ﬀ"}},
       {"éclair", {}},  // LIKE folds ASCII only
-      {"ÉCLAIR", {"É"}},
-      {"été", {"Ω"}},
-      {"STRASSE", {}},
+      {"ÉCLAIR", {"É"}}, {"été", {"Ω"}}, {"STRASSE", {}},
       {"STRAßE", {"ß"}},  // LIKE passes "STRA"; the second search folds ß
       {"100%", {"1"}},    // "%" is a wildcard for LIKE only
-      {"a_b", {"3"}},
-      {"it's", {"5"}},
+      {"a_b", {"3"}}, {"it's", {"5"}},
       {"mark", {"✓"}},  // white space, ignorable, control, empty, broken and undrawable left out
-      {"", {}},
-      {"nothing", {}},
+      {"", {}}, {"nothing", {}},
   };
   for (const auto& c : kCases) EXPECT_EQ(Search(c.text, 10), c.expected) << c.text;
   EXPECT_THAT(looked_up_, ElementsAre("CharacterDB"));
@@ -154,13 +130,8 @@ TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest
   WriteCharacters({{"n1", Info("x")}, {"e1", Info("x")}, {"n2", Info("x")}, {"e2", Info("x")}, {"e3", Info("x")}});
   emoji_ = {"e1", "e2", "e3"};
   const std::pair<std::uint64_t, Strings> kCases[] = {
-      {0, {"e1"}},
-      {1, {"e1"}},
-      {2, {"e1", "e2"}},
-      {4, {"e1", "e2", "e3", "n1"}},
-      {5, {"e1", "e2", "e3", "n1", "n2"}},
-      {std::uint64_t{1} << 63, {"e1", "e2", "e3"}},
-      {UINT64_MAX, {"e1", "e2", "e3"}},
+      {0, {"e1"}}, {1, {"e1"}}, {2, {"e1", "e2"}}, {4, {"e1", "e2", "e3", "n1"}}, {5, {"e1", "e2", "e3", "n1", "n2"}},
+      {std::uint64_t{1} << 63, {"e1", "e2", "e3"}}, {UINT64_MAX, {"e1", "e2", "e3"}},
   };
   for (const auto& [limit, expected] : kCases) EXPECT_EQ(Search("x", limit), expected) << limit;
 }
@@ -168,21 +139,13 @@ TEST_P(CharacterDatabaseTest, SearchLimitsAreUnsignedForEmojiAndSignedForTheRest
 TEST_P(CharacterDatabaseTest, RelatedCharacters) {
   WriteRelated({"aAáÀ", "a", "xyz", "👍👍🏽", "👍🏽👍🏿", "%q", "b_"});
   undrawable_ = {"À"};
-  const struct {
-    const char* text;
-    std::uint64_t limit;
-    Strings expected;
-  } kCases[] = {
+  const struct { const char* text; std::uint64_t limit; Strings expected; } kCases[] = {
       {"a", 10, {"A", "á"}},  // LIKE finds "A" rows too; the character itself and undrawable ones left out
-      {"A", 10, {"a", "á", "a"}},
-      {"a", 1, {"A"}},
-      {"a", 0, {}},
-      {"a", std::uint64_t{1} << 63, {}},
+      {"A", 10, {"a", "á", "a"}}, {"a", 1, {"A"}}, {"a", 0, {}}, {"a", std::uint64_t{1} << 63, {}},
       {"👍🏽", 10, {"👍", "👍", "🏽", "👍", "🏽", "👍", "🏿"}},  // split by code point, pairs kept
       {"👍🏽", 4, {"👍", "👍", "🏽", "👍"}},
       {"%", 10, {"q"}},  // escaped: only the row holding a real "%"
-      {"_", 10, {"b"}},
-      {"z", 10, {"x", "y"}},
+      {"_", 10, {"b"}}, {"z", 10, {"x", "y"}},
   };
   for (const auto& c : kCases) EXPECT_EQ(Related(c.text, c.limit), c.expected) << c.text << " " << c.limit;
   EXPECT_THAT(looked_up_, ElementsAre("RelatedCharDB"));
@@ -193,13 +156,10 @@ TEST_P(CharacterDatabaseTest, RelatedCharacters) {
 TEST_P(CharacterDatabaseTest, InformationRecords) {
   const std::string sixteen = "f0|f1|f2|f3|f4|f5|f6|f7|f8|f9|f10|f11|f12|f13|f14|f15";
   WriteCharacters({
-      {"中", sixteen},
-      {"十五", std::string(14, '|')},
-      {"十七", std::string(16, '|')},
+      {"中", sixteen}, {"十五", std::string(14, '|')}, {"十七", std::string(16, '|')},
       {"同", std::string(14, '|')},  // a row of fifteen fields, then a usable row for the same key
       {"同", "same" + std::string(15, '|')},
-      {"👍", "thumbs up" + std::string(15, '|')},
-      {"☝\uFE0F", "index pointing up" + std::string(15, '|')},
+      {"👍", "thumbs up" + std::string(15, '|')}, {"☝\uFE0F", "index pointing up" + std::string(15, '|')},
   });
   const MessageValue middle = Record("中");
   const std::pair<const char*, const char*> kTags[] = {

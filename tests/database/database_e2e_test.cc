@@ -47,11 +47,7 @@ class DatabaseE2ETest : public ServiceTest {
 };
 
 TEST_F(DatabaseE2ETest, EachRequestIsAnsweredFromTheBundlesDatabases) {
-  const struct {
-    const char *command, *text;
-    std::uint64_t limit;
-    Strings expected;
-  } kCases[] = {
+  const struct { const char *command, *text; std::uint64_t limit; Strings expected; } kCases[] = {
       // Emoji-font characters first, the named emoji before those that mention the word.
       {"search_matched_chars", "heart", 4, {"❤️", "💕", "🩷", "💙"}},
       {"search_matched_chars", "HEAVY BLACK HEART", 5, {"❤️", "❤", "❥"}},

@@ -13,23 +13,13 @@ namespace {
 
 TEST(FontCoverageTest, EmojiFontAndDefaultLikeFont) {
   ASSERT_TRUE(LoadLumerisFontConfiguration());
-  const struct {
-    const char* text;
-    bool emoji_font;
-    bool default_like;
-  } kCases[] = {
-      {"😀", true, true},
-      {"❤", true, true},
-      {"❤\uFE0F", true, true},  // U+FE0F has no glyph, yet the pair is drawn
-      {"👍🏽", true, true},
-      {"👨\u200D👩\u200D👧", true, true},  // zero-width joiners
-      {"🏴\U000E0067\U000E0062\U000E0073\U000E0063\U000E0074\U000E007F", true,
-       true},  // tag characters
-      {"a", false, true},
-      {"é", false, true},
-      {"a\uFE0F", false, true},
-      {"🦄a", false, false},  // no one font draws both
-      {"\U0001FFFE", false, false},
+  const struct { const char* text; bool emoji_font; bool default_like; } kCases[] = {
+      {"😀", true, true}, {"❤", true, true}, {"👍🏽", true, true}, {"a", false, true}, {"é", false, true},
+      {"a\uFE0F", false, true}, {"\U0001FFFE", false, false},
+      {"❤\uFE0F", true, true},                              // U+FE0F has no glyph, yet the pair is drawn
+      {"👨\u200D👩\u200D👧", true, true},                  // zero-width joiners
+      {"🏴\U000E0067\U000E0062\U000E0073\U000E0063\U000E0074\U000E007F", true, true},  // tag characters
+      {"🦄a", false, false},                                 // no one font draws both
   };
   for (const auto& c : kCases) {
     const icu::UnicodeString text = *DecodeUtf8(c.text);

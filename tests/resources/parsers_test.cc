@@ -71,19 +71,12 @@ TEST_F(UnicodeDataTest, RangesExpandWithDerivedNamesAndOnlyCharactersAreListed) 
 }
 
 TEST(HangulNameTest, FollowsTheUnicodeAlgorithm) {
-  struct Case {
-    char32_t cp;
-    const char* name;
-  };
-  for (const Case& c : {Case{0xAC00, "HANGUL SYLLABLE GA"}, Case{0xD7A3, "HANGUL SYLLABLE HIH"},
-                        Case{0xD4DB, "HANGUL SYLLABLE PWILH"}, Case{0xC544, "HANGUL SYLLABLE A"}}) {
-    EXPECT_EQ(HangulSyllableName(c.cp).value_or("<none>"), c.name) << std::hex << static_cast<unsigned>(c.cp);
-  }
-  EXPECT_FALSE(HangulSyllableName(0xABFF));
-  EXPECT_FALSE(HangulSyllableName(0xD7A4));
+  const std::pair<char32_t, const char*> kNames[] = {{0xAC00, "HANGUL SYLLABLE GA"}, {0xD7A3, "HANGUL SYLLABLE HIH"},
+      {0xD4DB, "HANGUL SYLLABLE PWILH"}, {0xC544, "HANGUL SYLLABLE A"}, {0xABFF, "<none>"}, {0xD7A4, "<none>"}};
+  for (const auto& [cp, name] : kNames) EXPECT_EQ(HangulSyllableName(cp).value_or("<none>"), name) << std::hex << +cp;
 }
 
-TEST(UcdFormatTest, RangesSequencesAndAliases) {
+TEST(UcdFormatTest, RangesSequencesAliasesAndUnihanValues) {
   std::vector<std::tuple<char32_t, char32_t, std::string>> ranges;
   for (const CodePointRange& r : ParseCodePointRanges("# comment\n0000..007F; Basic Latin\n\n00AA ; Latin # Lo FEMININE\n"
                                                       "ZZZZ..0001; Bad\n0010..0005; Backwards\n")) {
@@ -96,9 +89,7 @@ TEST(UcdFormatTest, RangesSequencesAndAliases) {
   ASSERT_EQ(aliases[0].size(), 2u);
   EXPECT_EQ(aliases[0][1].alias + " " + aliases[0][1].type, "NUL abbreviation");  // file order per code point
   EXPECT_EQ(aliases[0x1A2][0].type, "correction");
-}
-
-TEST(UnihanTest, VariantValuesDropSourceAnnotations) {
+  // Unihan variant values drop their source annotations.
   EXPECT_EQ(ParseUnihanCodePoints("U+53D1<kMatthews,kMeyerWempe U+5F42 junk"), (std::vector<char32_t>{0x53D1, 0x5F42}));
   EXPECT_TRUE(ParseUnihanCodePoints("").empty());
 }
@@ -123,22 +114,26 @@ TEST(CldrAnnotationsTest, SplitsKeywordsAndSkipsInheritanceMarkers) {
   EXPECT_FALSE(AddCldrAnnotations("<ldml><unclosed>", annotations));
 }
 
-TEST(CldrLabelsTest, ReadsLabelsScriptsAndPatterns) {
-  std::optional<CldrLocaleTexts> texts = ParseCldrLocaleTexts(R"(<ldml>
+// A parent's texts, with the forms that are skipped (an "alt" form, a pattern by count, an
+// inheritance marker), under a child that holds one label of its own.
+TEST(CldrLabelsTest, ReadsLabelsScriptsAndPatternsAndTheChildsOwnWin) {
+  std::optional<CldrLocaleTexts> parent = ParseCldrLocaleTexts(R"(<ldml>
     <localeDisplayNames><scripts><script type="Latn">Lateinisch</script>
       <script type="Latn" alt="short">Latein</script></scripts></localeDisplayNames>
     <characterLabels>
       <characterLabelPattern type="enclosed">{0} — umschlossen</characterLabelPattern>
       <characterLabelPattern type="strokes" count="one">{0} Strich</characterLabelPattern>
-      <characterLabel type="arrows">Pfeil</characterLabel>
+      <characterLabel type="arrows">Pfeil</characterLabel><characterLabel type="digits">Ziffern</characterLabel>
       <characterLabel type="braille">↑↑↑</characterLabel>
     </characterLabels></ldml>)");
-  ASSERT_TRUE(texts);
-  EXPECT_EQ(texts->script_names.at("Latn"), "Lateinisch");
-  EXPECT_EQ(texts->character_labels.at("arrows"), "Pfeil");
-  EXPECT_FALSE(texts->character_labels.contains("braille"));
-  EXPECT_EQ(texts->label_patterns.at("enclosed"), "{0} — umschlossen");
-  EXPECT_FALSE(texts->label_patterns.contains("strokes"));
+  ASSERT_TRUE(parent);
+  using Texts = std::map<std::string, std::string, std::less<>>;
+  CldrLocaleTexts child;
+  child.character_labels = {{"arrows", "Pfeile"}};
+  InheritCldrLocaleTexts(child, *parent);
+  EXPECT_EQ(child.character_labels, (Texts{{"arrows", "Pfeile"}, {"digits", "Ziffern"}}));
+  EXPECT_EQ(child.script_names, (Texts{{"Latn", "Lateinisch"}}));
+  EXPECT_EQ(child.label_patterns, (Texts{{"enclosed", "{0} — umschlossen"}}));
 }
 
 TEST(CldrLabelsTest, ParentLocalesFollowExplicitParentsThenTruncation) {
@@ -156,15 +151,6 @@ TEST(CldrLabelsTest, ParentLocalesFollowExplicitParentsThenTruncation) {
   EXPECT_EQ(LocalizationNameOfCldrLocale("zh_Hant_HK"), "zh-Hant-HK");
 }
 
-TEST(CldrLabelsTest, ChildTextsWinOverInheritedOnes) {
-  CldrLocaleTexts child, parent;
-  child.character_labels = {{"arrows", "child"}};
-  parent.character_labels = {{"arrows", "parent"}, {"digits", "parent digits"}};
-  InheritCldrLocaleTexts(child, parent);
-  EXPECT_EQ(child.character_labels.at("arrows"), "child");
-  EXPECT_EQ(child.character_labels.at("digits"), "parent digits");
-}
-
 constexpr std::string_view kEmojiTest =
     "# group: People & Body\n"
     "# subgroup: hand-fingers-closed\n"
@@ -180,7 +166,7 @@ constexpr std::string_view kEmojiTest =
     "# group: Component\n"
     "1F3FB                                                  ; component           # 🏻 E1.0 light skin tone\n";
 
-TEST(EmojiTestFileTest, ReadsEntriesWithGroupsAndNames) {
+TEST(EmojiTestFileTest, ReadsEntriesWithGroupsAndNamesAndFamilies) {
   std::vector<EmojiTestEntry> entries = ParseEmojiTest(kEmojiTest);
   ASSERT_EQ(entries.size(), 8u);
   EXPECT_EQ(entries[1].sequence, U"\U0001F44D\U0001F3FD");
@@ -191,10 +177,8 @@ TEST(EmojiTestFileTest, ReadsEntriesWithGroupsAndNames) {
   EXPECT_EQ(entries[7].status, EmojiStatus::kComponent);
   EXPECT_TRUE(HasSkinTone(entries[1].sequence));
   EXPECT_FALSE(HasSkinTone(entries[3].sequence));
-}
-
-TEST(EmojiGroupsTest, SkinToneAndGenderFamilies) {
-  std::vector<std::vector<std::u32string>> groups = EmojiGroups(ParseEmojiTest(kEmojiTest));
+  // Families of skin tones and genders.
+  const std::vector<std::vector<std::u32string>> groups = EmojiGroups(entries);
   const std::vector<std::u32string> thumbs = {U"\U0001F44D", U"\U0001F44D\U0001F3FD"};
   const std::vector<std::u32string> woman_running = {U"\U0001F3C3\u200D\u2640\uFE0F",
                                                      U"\U0001F3C3\U0001F3FD\u200D\u2640\uFE0F"};
@@ -283,26 +267,14 @@ class CharacterRowsTest : public ::testing::Test {
 TEST_F(CharacterRowsTest, EachHanFieldComesFromItsOwnUnihanProperty) {
   const auto built = Rows();
   const std::map<std::string, std::string> rows(built.begin(), built.end());
-  const struct {
-    const char* tag;
-    const char* value;
-  } kFields[] = {
+  const struct { const char* tag; const char* value; } kFields[] = {
       {"unam", "CJK UNIFIED IDEOGRAPH-4E01; nail"},  // derived name; kDefinition
       {"jyom", "TEI; HINOTO"},                       // kJapaneseOn; kJapaneseKun
       {"krpi", "정; CENG"},                          // kHangul without its source tag; kKorean
-      {"spin", "dīng"},                              // kMandarin, first value
-      {"swbx", ""},
-      {"swbh", ""},
-      {"sbix", "2"},      // kTotalStrokes, first value
-      {"cbai", "ding1"},  // kCantonese
-      {"tcan", "MN"},     // kCangjie
-      {"tday", ""},
-      {"tpin", "zhēng"},  // kMandarin, second value
-      {"tzhu", "ㄓㄥ"},   // Zhuyin of tpin
-      {"rsu1", "1.1"},    // kRSUnicode, values 1 to 4
-      {"rsu2", "1'.2"},
-      {"rsu3", "2.3"},
-      {"rsu4", "3.4"},
+      {"spin", "dīng"}, {"swbx", ""}, {"swbh", ""},  // kMandarin, first value
+      {"sbix", "2"}, {"cbai", "ding1"}, {"tcan", "MN"}, {"tday", ""},  // kTotalStrokes, first value; kCantonese; kCangjie
+      {"tpin", "zhēng"}, {"tzhu", "ㄓㄥ"},  // kMandarin, second value; its Zhuyin
+      {"rsu1", "1.1"}, {"rsu2", "1'.2"}, {"rsu3", "2.3"}, {"rsu4", "3.4"},  // kRSUnicode, values 1 to 4
   };
   ASSERT_TRUE(rows.contains("丁"));
   std::string expected;
@@ -338,17 +310,15 @@ TEST_F(CharacterRowsTest, NamesGatherEveryEnglishTextAndEmojiComeFirstInSearchOr
 }
 
 TEST(HanLanguageInfoTest, NamesTheLanguageOfEveryHanField) {
-  using plist::Array;
-  const plist::Value expected = plist::Dictionary{
-      {"tags", plist::Dictionary{{"jyom", "ja"}, {"krpi", "ko"}, {"spin", "zh-Hans"}, {"swbx", "zh-Hans"},
-                                 {"swbh", "zh-Hans"}, {"sbix", "zh-Hans"}, {"cbai", "yue"}, {"tcan", "zh-Hant"},
-                                 {"tday", "zh-Hant"}, {"tpin", "zh-Hant"}, {"tzhu", "zh-Hant"}, {"rsu1", "zh"},
-                                 {"rsu2", "zh"}, {"rsu3", "zh"}, {"rsu4", "zh"}}},
-      {"languages", plist::Dictionary{{"ja", Array{"jyom"}}, {"ko", Array{"krpi"}},
-                                      {"zh-Hans", Array{"spin", "swbx", "swbh", "sbix"}}, {"yue", Array{"cbai"}},
-                                      {"zh-Hant", Array{"tcan", "tday", "tpin", "tzhu"}},
-                                      {"zh", Array{"rsu1", "rsu2", "rsu3", "rsu4"}}}}};
-  EXPECT_EQ(HanLanguageInfo(), expected);
+  const std::pair<const char*, plist::Array> kLanguages[] = {
+      {"ja", {"jyom"}}, {"ko", {"krpi"}}, {"zh-Hans", {"spin", "swbx", "swbh", "sbix"}}, {"yue", {"cbai"}},
+      {"zh-Hant", {"tcan", "tday", "tpin", "tzhu"}}, {"zh", {"rsu1", "rsu2", "rsu3", "rsu4"}}};
+  plist::Dictionary tags, languages;
+  for (const auto& [language, fields] : kLanguages) {
+    languages.emplace(language, fields);
+    for (const plist::Value& tag : fields) tags.emplace(*tag.AsString(), language);
+  }
+  EXPECT_EQ(HanLanguageInfo(), (plist::Value(plist::Dictionary{{"tags", tags}, {"languages", languages}})));
 }
 
 }  // namespace

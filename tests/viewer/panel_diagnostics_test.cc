@@ -42,14 +42,12 @@ TEST(FrameRateMeterTest, LogsFramesAndTimeSinceItWasMade) {
 
 TEST(PanelNotificationsTest, EachNameIsItsOwnValue) {
   const std::pair<std::string, std::string> kNames[] = {
-      {LMKVistrelWindowWillOpen, "LMKVistrelWindowWillOpen"},
-      {LMKVistrelWindowDidOpen, "LMKVistrelWindowDidOpen"},
-      {LMKNavigationFocusMoved, "LMKNavigationFocusMoved"},
+      {LMKVistrelWindowWillOpen, "LMKVistrelWindowWillOpen"}, {LMKVistrelWindowDidOpen, "LMKVistrelWindowDidOpen"},
+      {LMKNavigationFocusMoved, "LMKNavigationFocusMoved"}, {LMKLocaleCountryInfoChanged, "LMKLocaleCountryInfoChanged"},
       {LMKNavigationCharacterSelectionMoved, "LMKNavigationCharacterSelectionMoved"},
       {LMKNavigationCategorySelectionMoved, "LMKNavigationCategorySelectionMoved"},
       {LMKNavigationSelectionConfirmed, "LMKNavigationSelectionConfirmed"},
       {LMKNavigationSelectionCanceled, "LMKNavigationSelectionCanceled"},
-      {LMKLocaleCountryInfoChanged, "LMKLocaleCountryInfoChanged"},
   };
   for (const auto& [constant, name] : kNames) EXPECT_EQ(constant, name);
 }
