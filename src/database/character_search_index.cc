@@ -262,7 +262,7 @@ class Reader {
     uint64_t count = 0;
     if (!Pod(&count) || count > in_.size() / sizeof(T)) return false;
     values->resize(count);
-    memcpy(values->data(), in_.data(), count * sizeof(T));
+    if (count > 0) memcpy(values->data(), in_.data(), count * sizeof(T));
     in_.remove_prefix(count * sizeof(T));
     return true;
   }
