@@ -203,7 +203,7 @@ std::vector<EmojiSubcategory> BuildEmojiSubcategories(const std::vector<EmojiTes
       {"Smileys & People", "smileys_people", "EmojiCategory-SmileysPeople", "☺", {"Smileys & Emotion", "People & Body"}},
       {"Animals & Nature", "animals_nature", "EmojiCategory-AnimalsNature", "✿", {"Animals & Nature"}},
       {"Food & Drink", "food_drink", "EmojiCategory-FoodDrink", "☕", {"Food & Drink"}},
-      {"Activities", "activities", "EmojiCategory-Activities", "⚽", {"Activities"}},
+      {"Activities", "activities", "EmojiCategory-Activities", "♠", {"Activities"}},
       {"Travel & Places", "travel_places", "EmojiCategory-TravelPlaces", "✈", {"Travel & Places"}},
       {"Objects", "objects", "EmojiCategory-Objects", "☎", {"Objects"}},
       {"Symbols", "symbols", "EmojiCategory-Symbols", "♥", {"Symbols"}},
