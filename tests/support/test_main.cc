@@ -23,10 +23,7 @@ namespace {
 
 void EnterSandbox() {
   const std::filesystem::path sandbox = LUMERIS_TEST_SANDBOX;
-  const struct {
-    const char* variable;
-    const char* directory;
-  } kDirectories[] = {
+  const struct { const char* variable; const char* directory; } kDirectories[] = {
       {"HOME", "home"},
       {"XDG_CONFIG_HOME", "config"},
       {"XDG_CONFIG_DIRS", "config-dirs"},
