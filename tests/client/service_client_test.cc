@@ -67,7 +67,7 @@ TEST_F(OnDemandStart, ClientsStartingTogetherStartOneService) {
   for (auto& future : starting) {
     std::unique_ptr<ServiceClient> client = future.get();
     ASSERT_TRUE(client);
-    const std::optional<MessageValue> reply = client->Request(Command("search_x", {{"transactionID", MessageValue::Uint64(8)}}), 2s);
+    const auto reply = client->Request(Command("search_x", {{"transactionID", MessageValue::Uint64(8)}}), 2s);
     EXPECT_EQ(reply.value_or(MessageValue()).GetUint64("transactionID"), 8u);
   }
   StopStartedService(socket_path_);

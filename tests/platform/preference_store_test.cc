@@ -289,7 +289,7 @@ TEST_F(PreferenceStoreTest, WritersKilledAtRandomMomentsNeverTearTheFile) {
     // One read decides: a file that appears between two looks is not unparsable.
     const FileContents contents = PreferencesFileSystem().Read(DomainFile());
     if (contents.status == ReadStatus::kMissing) continue;
-    const std::optional<Value> file = contents.status == ReadStatus::kOk ? plist::ParsePropertyList(contents.bytes) : std::nullopt;
+    const auto file = contents.status == ReadStatus::kOk ? plist::ParsePropertyList(contents.bytes) : std::nullopt;
     unparsable += !file || !file->AsDictionary();
     for (auto& [prefix, last] : last_seen) {
       const Value* first = file ? file->Find(prefix + "0") : nullptr;  // nullptr too when not a dictionary
@@ -350,25 +350,21 @@ TEST(PreferencesPathTest, DefaultsAndIgnoredEnvironmentValues) {
 // The CFPreferences functions on the shared store.
 TEST(CFPreferencesTest, IntegerAndBooleanReadersFollowTheValueType) {
   testing::IsolatedUserEnvironment env;
-  const struct {
-    std::optional<Value> value;
-    std::int64_t integer;
-    bool integer_valid, boolean, boolean_valid;
-  } cases[] = {
+  const std::tuple<std::optional<Value>, std::int64_t, bool, bool, bool> cases[] = {  // integer, valid, boolean, valid
       {std::nullopt, 0, false, false, false}, {Value(42), 42, true, false, false}, {Value(-7), -7, true, false, false},
       {Value(true), 0, false, true, true},    {Value(false), 0, false, false, true}, {Value("1"), 0, false, false, false},
       {Value(1.0), 0, false, false, false},   {Value(plist::Array{1}), 0, false, false, false},
   };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.value ? ::testing::PrintToString(c.value->type()) : "absent");
-    CFPreferencesSetAppValue("key", c.value, "test.readers");
+  for (const auto& [value, integer, integer_valid, boolean, boolean_valid] : cases) {
+    SCOPED_TRACE(value ? ::testing::PrintToString(value->type()) : "absent");
+    CFPreferencesSetAppValue("key", value, "test.readers");
     ASSERT_TRUE(CFPreferencesAppSynchronize("test.readers"));
-    bool valid = !c.integer_valid;
-    EXPECT_EQ(CFPreferencesGetAppIntegerValue("key", "test.readers", &valid), c.integer);
-    EXPECT_EQ(valid, c.integer_valid);
-    valid = !c.boolean_valid;
-    EXPECT_EQ(CFPreferencesGetAppBooleanValue("key", "test.readers", &valid), c.boolean);
-    EXPECT_EQ(valid, c.boolean_valid);
+    bool valid = !integer_valid;
+    EXPECT_EQ(CFPreferencesGetAppIntegerValue("key", "test.readers", &valid), integer);
+    EXPECT_EQ(valid, integer_valid);
+    valid = !boolean_valid;
+    EXPECT_EQ(CFPreferencesGetAppBooleanValue("key", "test.readers", &valid), boolean);
+    EXPECT_EQ(valid, boolean_valid);
   }
 }
 

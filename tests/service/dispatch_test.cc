@@ -142,15 +142,20 @@ TEST_F(DispatchTest, TargetBeginningWithRecentsSelectsRecentsAnyOtherFavoritesAn
   }
 }
 
-TEST_F(DispatchTest, SearchesPutResultAndEchoTransactionId) {
+TEST_F(DispatchTest, RepliesCarryTheResultSearchesEchoTheTransactionIdAndOpenLargeViewerAnswersEmpty) {
   EXPECT_EQ(Dispatch(Request("search_matched_chars", {{"string", Str("cat")}, {"limit", U(12)}, {"transactionID", U(99)}})),
             MessageValue::MakeDictionary({{"result", matched_}, {"transactionID", U(99)}}));
   EXPECT_EQ(calls_, (Calls{"UpdateCountryInfoAndCheckSignificantChange()", "createXPCArrayForSearchString(cat,12)"}));
   EXPECT_EQ(Dispatch(Request("search_related_chars", {{"limit", Str("12")}})),
             MessageValue::MakeDictionary({{"result", related_}, {"transactionID", U(0)}}));
   EXPECT_EQ(calls_, Calls{"createXPCArrayForRelatedCharacters(,0)"});
-  EXPECT_EQ(Dispatch(Request("search_", {{"transactionID", U(5)}})), MessageValue::MakeDictionary({{"transactionID", U(5)}}));
+  EXPECT_EQ(Dispatch(Request("search_", {{"transactionID", U(5)}})),
+            MessageValue::MakeDictionary({{"transactionID", U(5)}}));
   EXPECT_TRUE(calls_.empty());
+  EXPECT_EQ(Dispatch(Request("read_categorydata")), MessageValue::MakeDictionary({{"result", categories_}}));
+  EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(absent)"});
+  EXPECT_EQ(Dispatch(Request("open_large_viewer", {{"path", Str("/p")}})), MessageValue::MakeDictionary());
+  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
 }
 
 TEST_F(DispatchTest, ReadRecentsFavoritesCollectsFourValuesInOrder) {
@@ -184,13 +189,6 @@ TEST_F(DispatchTest, SaveStatePassesDataOnlyWhenItParsesAsJson) {
     EXPECT_FALSE(Dispatch(request));
     EXPECT_EQ(calls_, Calls{"SetLastState(" + std::string(passed) + ",'app')"});
   }
-}
-
-TEST_F(DispatchTest, CategoryDataAnswersItsResultAndOpenLargeViewerAnEmptyReplyAfterWriting) {
-  EXPECT_EQ(Dispatch(Request("read_categorydata")), MessageValue::MakeDictionary({{"result", categories_}}));
-  EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(absent)"});
-  EXPECT_EQ(Dispatch(Request("open_large_viewer", {{"path", Str("/p")}})), MessageValue::MakeDictionary());
-  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
 }
 
 // Every string a request carries goes through the conversion: one that does not convert, like a

@@ -196,12 +196,10 @@ TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
   EXPECT_TRUE(EnsurePrivateDirectory(fresh, &why)) << why;
   EXPECT_EQ(std::filesystem::status(fresh).permissions(), std::filesystem::perms::owner_all);
 
-  std::filesystem::create_directory(dir.path() / "open");
-  chmod((dir.path() / "open").c_str(), 0755);
+  for (const auto& [name, mode] : {std::pair{"open", 0755}, {"foreign", 0700}}) mkdir((dir.path() / name).c_str(), mode);
+  chmod((dir.path() / "open").c_str(), 0755);  // whatever the umask
   std::filesystem::create_directory_symlink(fresh, dir.path() / "link");
   std::ofstream(dir.path() / "file") << "x";
-  std::filesystem::create_directory(dir.path() / "foreign");
-  chmod((dir.path() / "foreign").c_str(), 0700);
   std::vector<std::pair<std::string, std::string>> refused = {{"open", "0700"}, {"link", ""}, {"file", ""}};
   if (chown((dir.path() / "foreign").c_str(), 65534, 65534) == 0) refused.emplace_back("foreign", "another user");
   for (const auto& [name, reason] : refused) {

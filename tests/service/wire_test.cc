@@ -17,7 +17,8 @@ MessageValue SampleBody() {
       {"negative integral double", MessageValue::Double(-3.0)}, {"string", MessageValue::String("text")},
       {"invalid utf-8", MessageValue::String("\xff\xc3(")}, {"embedded nul", MessageValue::String(std::string("a\0b", 3))},
       {"data", MessageValue::DataFromBytes(std::string("\0\x01\xff", 3))}, {"empty data", MessageValue::Data({})},
-      {"array", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::MakeArray(), MessageValue::MakeDictionary()})},
+      {"array", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::MakeArray(),
+                                         MessageValue::MakeDictionary()})},
       {"", MessageValue::String("empty key")},
   });
 }

@@ -26,8 +26,9 @@ class StoreOperationsTest : public StoreTest {
 
 // The global member does not depend on the application, so it is the one thing read without one.
 TEST_F(StoreOperationsTest, WithoutIdentifierOrApplicationNothingIsWrittenAndOnlyTheGlobalMemberRead) {
-  SeedStore({{"Recents:", plist::Array{"r"}}, {"Favorites:", plist::Array{"f"}}, {"SkinTones:", plist::Dictionary{{"a", "b"}}},
-             {"State:", plist::Dictionary{{"s", 1}}}, {"VTGlobalEmojiDiversityDescribed", true}});
+  SeedStore({{"Recents:", plist::Array{"r"}}, {"Favorites:", plist::Array{"f"}},
+             {"SkinTones:", plist::Dictionary{{"a", "b"}}}, {"State:", plist::Dictionary{{"s", 1}}},
+             {"VTGlobalEmojiDiversityDescribed", true}});
   const plist::Dictionary before = StoredDomain();
   EXPECT_FALSE(operations_.CopyRecentsIDArray(std::nullopt));
   EXPECT_FALSE(operations_.CopyFavoritesIDArray(std::nullopt));

@@ -59,7 +59,8 @@ TEST_F(StoreTest, UnversionedDomainIsWipedOnlyByTheOperationsThatCheck) {
     EXPECT_EQ(domain.contains("Leftover"), !c.wipes);
     EXPECT_EQ(domain.contains("Recents:old"), !c.wipes);
     EXPECT_TRUE(*c.written == '\0' || domain.contains(c.written));
-    EXPECT_EQ(StoredValue("version"), c.wipes ? plist::Value(1) : c.version ? std::optional(plist::Value(*c.version)) : std::nullopt);
+    const std::optional<plist::Value> version = c.version ? std::optional(plist::Value(*c.version)) : std::nullopt;
+    EXPECT_EQ(StoredValue("version"), c.wipes ? plist::Value(1) : version);
   }
 }
 
