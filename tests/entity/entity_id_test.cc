@@ -18,7 +18,8 @@ using Text = std::optional<icu::UnicodeString>;
 
 const icu::UnicodeString kEmojiFont(u"VantorelColorEmoji");
 
-CharacterInfo Info(Text character, Text font, std::optional<uint32_t> glyph, std::map<std::string, std::string> extra = {}) {
+CharacterInfo Info(Text character, Text font, std::optional<uint32_t> glyph,
+                   std::map<std::string, std::string> extra = {}) {
   return CharacterInfo{std::move(character), std::move(font), glyph, std::move(extra)};
 }
 icu::UnicodeString Current(const std::string& json) { return u"com.vantorel.lmk:" + DecodeUtf8Lenient(json); }
@@ -107,12 +108,7 @@ TEST(EntityIDFromOldCharacterInfo, WritesTaggedFieldsThatReadBack) {
 // Fields are the matches of "<[^>]+>[^<]+"; without any known tag the whole rest is the text.
 // The dictionary holds a glyph only when a glyph tag was read.
 TEST(CharacterInfoFromEntityIDOldForm, ReadsTaggedAndUntaggedFields) {
-  const struct {
-    const char16_t* rest;
-    Text character, font;
-    uint32_t glyph;
-    std::optional<uint32_t> info_glyph;
-  } cases[] = {
+  const struct { const char16_t* rest; Text text, font; uint32_t glyph; std::optional<uint32_t> in_info; } cases[] = {
       {u"A", u"A", {}, 0, {}}, {u"<null>", {}, {}, 0, {}},
       {u"", {}, {}, 0, {}}, {u"<", u"<", {}, 0, {}},
       {u"<font>F<string><", {}, u"F", 0, {}}, {u"<glyph>0", u"<glyph>0", {}, 0, 0},
@@ -127,8 +123,7 @@ TEST(CharacterInfoFromEntityIDOldForm, ReadsTaggedAndUntaggedFields) {
       {u"<font>F>G<string>A>B", u"A>B", u"F>G", 0, {}},
       {u"junk<font>F<string>A", u"A", u"F", 0, {}}};
   for (const auto& c : cases) {
-    EXPECT_EQ(ExpectRead(Old(c.rest), c.character, c.font, c.glyph).info,
-              Info(c.character, c.font, c.info_glyph))
+    EXPECT_EQ(ExpectRead(Old(c.rest), c.text, c.font, c.glyph).info, Info(c.text, c.font, c.in_info))
         << ::testing::PrintToString(icu::UnicodeString(c.rest));
   }
 }

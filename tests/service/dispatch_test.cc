@@ -83,11 +83,8 @@ class DispatchTest : public ::testing::Test {
 };
 
 TEST_F(DispatchTest, CommandsMatchByPrefixInTableOrderAndOnlyReadingCommandsReply) {
-  const struct {
-    const char* command;
-    const char* first_call;  // "" when nothing may be called
-    bool replies;
-  } cases[] = {
+  // `first_call` is "" when nothing may be called.
+  const struct { const char* command, *first_call; bool replies; } cases[] = {
       {"search_matched_chars", "createXPCArrayForSearchString(s,0)", true},
       {"search_matched_charsXYZ", "createXPCArrayForSearchString(s,0)", true},
       {"search_related_chars", "createXPCArrayForRelatedCharacters(s,0)", true},
@@ -143,7 +140,8 @@ TEST_F(DispatchTest, TargetBeginningWithRecentsSelectsRecentsAnyOtherFavoritesAn
 }
 
 TEST_F(DispatchTest, RepliesCarryTheResultSearchesEchoTheTransactionIdAndOpenLargeViewerAnswersEmpty) {
-  EXPECT_EQ(Dispatch(Request("search_matched_chars", {{"string", Str("cat")}, {"limit", U(12)}, {"transactionID", U(99)}})),
+  EXPECT_EQ(Dispatch(Request("search_matched_chars",
+                             {{"string", Str("cat")}, {"limit", U(12)}, {"transactionID", U(99)}})),
             MessageValue::MakeDictionary({{"result", matched_}, {"transactionID", U(99)}}));
   EXPECT_EQ(calls_, (Calls{"UpdateCountryInfoAndCheckSignificantChange()", "createXPCArrayForSearchString(cat,12)"}));
   EXPECT_EQ(Dispatch(Request("search_related_chars", {{"limit", Str("12")}})),

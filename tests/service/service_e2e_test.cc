@@ -39,12 +39,9 @@ TEST_F(ServiceTest, OnlyReadingCommandsWantingAReplyAreAnsweredInArrivalOrder) {
 
 TEST_F(ServiceTest, MalformedOrCutFrameEndsOnlyItsConnectionAfterTheWholeFramesBeforeIt) {
   const std::string whole = EncodeFrame(Frame{FrameKind::kWantsReply, 1, Command("search_x")});
-  const struct {
-    const char* name;
-    std::string bytes;
-    bool close_writing;
-  } rows[] = {{"never-used byte", whole + "\xc1", false},
-              {"peer closes mid-frame", whole + whole.substr(0, whole.size() / 2), true}};
+  const struct { const char* name; std::string bytes; bool close_writing; } rows[] = {
+      {"never-used byte", whole + "\xc1", false},
+      {"peer closes mid-frame", whole + whole.substr(0, whole.size() / 2), true}};
   for (const auto& row : rows) {
     SCOPED_TRACE(row.name);
     RawConnection bad = Connect();

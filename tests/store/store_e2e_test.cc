@@ -106,10 +106,10 @@ TEST_F(StoreServiceTest, EveryStoreCommandNotifiesAndIsReadBackFromTheFile) {
   EXPECT_EQ(Payload(reply, "skintones"), "{\"" + std::string(kThumbsUp) + "\":\"" + kThumbsUpMedium + "\"}");
   EXPECT_EQ(Payload(reply, "state"), R"({"VTGlobalEmojiDiversityDescribed":"g","tab":1})");
   EXPECT_EQ(Payload(readAll("other.app"), "state"), R"({"VTGlobalEmojiDiversityDescribed":"g"})");
-  StringVector keys;
-  for (const auto& [key, value] : StoredDomain()) keys.push_back(key);
-  EXPECT_THAT(keys, ElementsAre("Favorites:test.identifier", "Recents:test.identifier", "SkinTones:test.identifier",
-                                "State:app", "VTGlobalEmojiDiversityDescribed", "version"));
+  using ::testing::Key;
+  EXPECT_THAT(StoredDomain(), ElementsAre(Key("Favorites:test.identifier"), Key("Recents:test.identifier"),
+                                          Key("SkinTones:test.identifier"), Key("State:app"),
+                                          Key("VTGlobalEmojiDiversityDescribed"), Key("version")));
 
   send(Set("recents", {}));
   EXPECT_EQ(notifications(1), 1u) << "an empty recents list";

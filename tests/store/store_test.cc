@@ -121,11 +121,7 @@ TEST_F(RecentsTest, EveryStoreNotifiesOnceAndKeepsTheHistoryInStepWithTheList) {
 TEST(HorseRacingRepair, RepairsOnlyTheFirstQuotedSpanThatCarriesAModifier) {
   const std::string plain = PlainID(kHorseRacing), modified = PlainID(kHorseRacingLight);
   const std::string quoted = std::string("\"") + kHorseRacing;
-  const struct {
-    const char* name;
-    std::optional<plist::Value> stored;
-    std::optional<StringVector> repaired;
-  } cases[] = {
+  const struct { const char* name; std::optional<plist::Value> stored; std::optional<StringVector> repaired; } cases[] = {
       {"absent", std::nullopt, std::nullopt}, {"not a list", plist::Value(modified), std::nullopt},
       {"empty", plist::Array{}, std::nullopt}, {"no horse", plist::Array{PlainID("a")}, std::nullopt},
       {"already plain", plist::Array{plain}, std::nullopt},
@@ -192,17 +188,14 @@ TEST_F(StoreTest, TheDefaultIdentifierConvertsOlderRecentsOnceAndOthersNever) {
 }
 
 TEST_F(StoreTest, FavoritesComeFromTheInputMethodFirstThenTheOlderServerWithoutNotifying) {
-  const struct {
-    bool input_method;
-    StringVector expected;
-  } cases[] = {{true, {PlainID("F")}}, {false, {PlainID("S"), PlainID("T")}}};
-  for (const auto& c : cases) {
+  const std::pair<bool, StringVector> cases[] = {{true, {PlainID("F")}}, {false, {PlainID("S"), PlainID("T")}}};
+  for (const auto& [input_method, expected] : cases) {  // whether the input method holds favourites
     SeedStore({{"version", 1}});
     SeedDomain("com.vantorel.SorvexServer", {{"SorvexFavorites", OldItems({"S", "T"})}});
-    SeedDomain("com.vantorel.SorvendiIM", c.input_method ? plist::Dictionary{{"VTFavorites", OldItems({"F"})}}
-                                                  : plist::Dictionary{});
-    EXPECT_EQ(StringsOf(CopyFavoritesIDArray(kDefaultIdentifier)), c.expected);
-    EXPECT_EQ(StoredList("Favorites:com.vantorel.Lumeris.DefaultDataStorage"), c.expected);
+    SeedDomain("com.vantorel.SorvendiIM",
+               input_method ? plist::Dictionary{{"VTFavorites", OldItems({"F"})}} : plist::Dictionary{});
+    EXPECT_EQ(StringsOf(CopyFavoritesIDArray(kDefaultIdentifier)), expected);
+    EXPECT_EQ(StoredList("Favorites:com.vantorel.Lumeris.DefaultDataStorage"), expected);
     EXPECT_EQ(StoredValue("VTFavoritesConverted"), plist::Value(true));
   }
   EXPECT_EQ(posts(), 0);
@@ -229,9 +222,7 @@ class SkinToneTest : public StoreTest {
 
 // Only skin-tone emoji in the emoji font are recorded (and notified); other entries stay.
 TEST_F(SkinToneTest, SkinToneEmojiInTheEmojiFontAreRecordedAndNotifiedAndOtherChoicesChangeNothing) {
-  const struct {
-    std::string item, key, value;  // key "" when refused
-  } cases[] = {
+  const struct { std::string item, key, value; } cases[] = {  // key "" when refused
       {PlainID(kThumbsUpMedium), "", ""},  // no font
       {"com.vantorel.lmk:{\"char\":\"" + std::string(kThumbsUpMedium) + "\",\"font\":\"Courier\"}", "", ""},
       {EmojiID(kGrinning), "", ""},  // takes no skin tone
