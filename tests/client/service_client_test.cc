@@ -63,16 +63,12 @@ TEST_F(OnDemandStart, ClientsStartingTogetherStartOneService) {
                          Script("counting", "echo started >> '" + starts.string() + "'\nexec '" +
                                                 FileServiceProgram().string() + "'\n"));
   std::vector<std::future<std::unique_ptr<ServiceClient>>> starting;
-  for (int i = 0; i < 4; ++i) {
-    starting.push_back(std::async(std::launch::async, [] { return ServiceClient::Connect(); }));
-  }
+  for (int i = 0; i < 4; ++i) starting.push_back(std::async(std::launch::async, [] { return ServiceClient::Connect(); }));
   for (auto& future : starting) {
     std::unique_ptr<ServiceClient> client = future.get();
     ASSERT_TRUE(client);
-    std::optional<MessageValue> reply =
-        client->Request(Command("search_x", {{"transactionID", MessageValue::Uint64(8)}}), 2s);
-    ASSERT_TRUE(reply);
-    EXPECT_EQ(reply->GetUint64("transactionID"), 8u);
+    const auto reply = client->Request(Command("search_x", {{"transactionID", MessageValue::Uint64(8)}}), 2s);
+    EXPECT_EQ(reply.value_or(MessageValue()).GetUint64("transactionID"), 8u);
   }
   StopStartedService(socket_path_);
   EXPECT_EQ(FileText(starts), "started\n") << "more than one service was started";
@@ -121,28 +117,22 @@ TEST_F(OnDemandStart, StartedServiceLogsToTheStateDirectoryWithoutAJournal) {
 
 TEST(ClientConnectErrors, ReportWhyInsteadOfHanging) {
   IsolatedUserEnvironment environment;
-  std::string error;
-  ServiceClientOptions no_start;
-  no_start.start_on_demand = false;
-  EXPECT_FALSE(ServiceClient::Connect(no_start, &error));
-  EXPECT_NE(error.find("cannot connect"), std::string::npos) << error;
-
-  environment.env().Set("LUMERIS_FILESERVICE", (environment.root() / "missing").string());
-  EXPECT_FALSE(ServiceClient::Connect({}, &error));
-  EXPECT_NE(error.find("cannot execute"), std::string::npos) << error;
-
-  // A program that runs but never listens: Connect gives up after the start timeout.
-  environment.env().Set("LUMERIS_FILESERVICE", "/bin/true");
-  ServiceClientOptions short_wait;
-  short_wait.start_timeout = 200ms;
-  EXPECT_FALSE(ServiceClient::Connect(short_wait, &error));
-  EXPECT_NE(error.find("could not connect"), std::string::npos) << error;
+  // The program to start; without a start, a missing program, one that runs but never listens.
+  const std::tuple<std::string, ServiceClientOptions, const char*> cases[] = {
+      {FileServiceProgram().string(), {.start_on_demand = false}, "cannot connect"},
+      {(environment.root() / "missing").string(), {}, "cannot execute"},
+      {"/bin/true", {.start_timeout = 200ms}, "could not connect"}};
+  for (const auto& [program, options, reason] : cases) {
+    environment.env().Set("LUMERIS_FILESERVICE", program);
+    std::string error;
+    EXPECT_FALSE(ServiceClient::Connect(options, &error));
+    EXPECT_NE(error.find(reason), std::string::npos) << error;
+  }
 }
 
-TEST(FindFileServiceProgram, EnvironmentVariableComesFirst) {
+// LUMERIS_FILESERVICE, when set, is what the on-demand tests start.
+TEST(FindFileServiceProgram, WithoutTheVariableThePathIsSearched) {
   ScopedEnv env;
-  env.Set("LUMERIS_FILESERVICE", "/opt/elsewhere/lumeris-fileservice");
-  EXPECT_EQ(FindFileServiceProgram(), std::filesystem::path("/opt/elsewhere/lumeris-fileservice"));
   env.Set("LUMERIS_FILESERVICE", std::nullopt);
   env.Set("PATH", FileServiceProgram().parent_path().string());
   std::optional<std::filesystem::path> found = FindFileServiceProgram();

@@ -19,35 +19,29 @@ using Text = std::optional<icu::UnicodeString>;
 const icu::UnicodeString kEmojiFont(u"VantorelColorEmoji");
 
 CharacterInfo Info(Text character, Text font, std::optional<uint32_t> glyph,
-                   std::map<std::string, std::string> extra_json = {}) {
-  return CharacterInfo{std::move(character), std::move(font), glyph, std::move(extra_json)};
+                   std::map<std::string, std::string> extra = {}) {
+  return CharacterInfo{std::move(character), std::move(font), glyph, std::move(extra)};
 }
+icu::UnicodeString Current(const std::string& json) { return u"com.vantorel.lmk:" + DecodeUtf8Lenient(json); }
+icu::UnicodeString Old(const char16_t* rest) { return icu::UnicodeString(u"com.vantorel.Lumeris:") + rest; }
 
-icu::UnicodeString Current(const std::string& json) {
-  return icu::UnicodeString(u"com.vantorel.lmk:") + DecodeUtf8Lenient(json);
-}
-
-icu::UnicodeString Old(const char16_t* rest) {
-  return icu::UnicodeString(u"com.vantorel.Lumeris:") + icu::UnicodeString(rest);
-}
-
-// Reads `id` asking for every out-argument; the glyph starts as a value no reading gives.
+// A reading of an ID with every out-argument; the glyph starts as a value no reading gives.
 struct Reading {
   bool ok = false;
   std::optional<CharacterInfo> info;
   Text character, font;
   uint32_t glyph = 0xDEADBEEF;
+  bool operator==(const Reading&) const = default;
 };
 
-Reading Read(const icu::UnicodeString& id) {
-  Reading r;
+// Reads `id` into the values of `r`, which show what the reading leaves alone.
+Reading Read(const icu::UnicodeString& id, Reading r = {}) {
   r.ok = CharacterInfoFromEntityID(id, &r.info, &r.character, &r.font, &r.glyph);
   return r;
 }
 
 // Reads `id` and checks the three out-values; returns the reading for its dictionary.
-Reading ExpectRead(const icu::UnicodeString& id, const Text& character, const Text& font,
-                   uint32_t glyph) {
+Reading ExpectRead(const icu::UnicodeString& id, const Text& character, const Text& font, uint32_t glyph) {
   SCOPED_TRACE(::testing::PrintToString(id));
   Reading reading = Read(id);
   EXPECT_TRUE(reading.ok);
@@ -76,37 +70,27 @@ TEST(EntityIDFromCharacterInfo, WritesCompactJsonInAFixedKeyOrder) {
     EXPECT_EQ(EntityIDFromCharacterInfo(c.info), Current(c.json)) << c.json;
 }
 
-// The same dictionary gives the same text, whatever key order the ID it was read from had.
+// The same dictionary gives the same text, whatever key order or spacing the ID it was read from had.
 TEST(EntityIDFromCharacterInfo, SameDictionaryAlwaysGivesTheSameText) {
-  const icu::UnicodeString expected = EntityIDFromCharacterInfo(Info(u"x", u"F", 7));
   for (auto json : {R"({"glyph":7,"font":"F","char":"x"})", R"({"font":"F","char":"x","glyph":7})",
                     R"( { "char" : "x" , "glyph" : 7 , "font" : "F" } )"}) {
-    const Reading reading = Read(Current(json));
-    ASSERT_TRUE(reading.ok && reading.info.has_value()) << json;
-    EXPECT_EQ(EntityIDFromCharacterInfo(*reading.info), expected) << json;
+    EXPECT_EQ(EntityIDFromCharacterInfo(Read(Current(json)).info.value_or(Info({}, {}, {}))),
+              Current(R"({"char":"x","font":"F","glyph":7})")) << json;
   }
 }
 
 TEST(EntityIDFromCharacterInfo, ReadsBackWhatItWrote) {
-  for (const CharacterInfo& info :
-       {Info(u"A", {}, {}), Info(Scalars({0x1F44D, 0x1F3FD}), kEmojiFont, {}),
-        Info(u"a/b\"c\\d\te", u"Font/Name", 65535), Info(Scalars({0x10FFFF, 0}), {}, 0),
-        Info({}, kEmojiFont, {})}) {
-    const Reading reading = ExpectRead(EntityIDFromCharacterInfo(info), info.character, info.font,
-                                       info.glyph.value_or(0));
-    EXPECT_EQ(reading.info, info);
+  for (const CharacterInfo& info : {Info(u"A", {}, {}), Info(Scalars({0x1F44D, 0x1F3FD}), kEmojiFont, {}),
+                                    Info(u"a/b\"c\\d\te", u"Font/Name", 65535), Info(Scalars({0x10FFFF, 0}), {}, 0),
+                                    Info({}, kEmojiFont, {})}) {
+    EXPECT_EQ(ExpectRead(EntityIDFromCharacterInfo(info), info.character, info.font, info.glyph.value_or(0)).info, info);
   }
 }
 
 // Tags before the text; an empty text is "<null>"; the glyph is written as a signed 32-bit
 // number. Rows with a non-empty text and font (or none) read back to the same three values.
 TEST(EntityIDFromOldCharacterInfo, WritesTaggedFieldsThatReadBack) {
-  const struct {
-    icu::UnicodeString character;
-    Text font;
-    uint32_t glyph;
-    const char16_t* rest;
-  } cases[] = {
+  const struct { icu::UnicodeString character; Text font; uint32_t glyph; const char16_t* rest; } cases[] = {
       {u"A", {}, 0, u"A"}, {u"", {}, 0, u"<null>"}, {u"A", u"F", 7, u"<font>F<glyph>7<string>A"},
       {u"A", u"", 0, u"<font><string>A"}, {u"A", {}, 7, u"<glyph>7<string>A"},
       {u"", u"F", 0, u"<font>F<string><null>"}, {u"A", {}, 0xFFFFFFFF, u"<glyph>-1<string>A"},
@@ -124,12 +108,7 @@ TEST(EntityIDFromOldCharacterInfo, WritesTaggedFieldsThatReadBack) {
 // Fields are the matches of "<[^>]+>[^<]+"; without any known tag the whole rest is the text.
 // The dictionary holds a glyph only when a glyph tag was read.
 TEST(CharacterInfoFromEntityIDOldForm, ReadsTaggedAndUntaggedFields) {
-  const struct {
-    const char16_t* rest;
-    Text character, font;
-    uint32_t glyph;
-    std::optional<uint32_t> info_glyph;
-  } cases[] = {
+  const struct { const char16_t* rest; Text text, font; uint32_t glyph; std::optional<uint32_t> in_info; } cases[] = {
       {u"A", u"A", {}, 0, {}}, {u"<null>", {}, {}, 0, {}},
       {u"", {}, {}, 0, {}}, {u"<", u"<", {}, 0, {}},
       {u"<font>F<string><", {}, u"F", 0, {}}, {u"<glyph>0", u"<glyph>0", {}, 0, 0},
@@ -144,8 +123,7 @@ TEST(CharacterInfoFromEntityIDOldForm, ReadsTaggedAndUntaggedFields) {
       {u"<font>F>G<string>A>B", u"A>B", u"F>G", 0, {}},
       {u"junk<font>F<string>A", u"A", u"F", 0, {}}};
   for (const auto& c : cases) {
-    EXPECT_EQ(ExpectRead(Old(c.rest), c.character, c.font, c.glyph).info,
-              Info(c.character, c.font, c.info_glyph))
+    EXPECT_EQ(ExpectRead(Old(c.rest), c.text, c.font, c.glyph).info, Info(c.text, c.font, c.in_info))
         << ::testing::PrintToString(icu::UnicodeString(c.rest));
   }
 }
@@ -176,17 +154,11 @@ TEST(CharacterInfoFromEntityIDCurrentForm, ConvertsGlyphNumbersTo32Bits) {
 }
 
 TEST(CharacterInfoFromEntityIDErrors, RefusesStringsWithoutAPrefixAndWritesNothing) {
-  for (const char16_t* id : {u"", u"A", u"com.vantorel.lmk", u"COM.VANTOREL.LMK:{}",
-                             u"com.vantorel.lumeris:A", u" com.vantorel.lmk:{}"}) {
-    std::optional<CharacterInfo> info = Info(u"keep", {}, {});
-    Text character = icu::UnicodeString(u"keep"), font = character;
-    uint32_t glyph = 99;
-    EXPECT_FALSE(CharacterInfoFromEntityID(id, &info, &character, &font, &glyph));
+  const Reading kept{false, Info(u"keep", {}, {}), u"keep", u"keep", 99};
+  for (const char16_t* id : {u"", u"A", u"com.vantorel.lmk", u"COM.VANTOREL.LMK:{}", u"com.vantorel.lumeris:A",
+                             u" com.vantorel.lmk:{}"}) {
+    EXPECT_TRUE(Read(id, kept) == kept) << ::testing::PrintToString(icu::UnicodeString(id));
     EXPECT_FALSE(CharacterInfoFromEntityID(id));
-    EXPECT_EQ(info, Info(u"keep", {}, {}));
-    EXPECT_EQ(character, u"keep");
-    EXPECT_EQ(font, u"keep");
-    EXPECT_EQ(glyph, 99u);
   }
 }
 
@@ -213,14 +185,9 @@ TEST(CharacterInfoFromEntityIDErrors, NestingIsLimitedToSixtyFourLevels) {
 }
 
 TEST(CharacterInfoFromEntityIDErrors, UnencodableTextLeavesTheInfoUntouched) {
-  std::optional<CharacterInfo> info = Info(u"keep", {}, {});
-  Text character = icu::UnicodeString(u"old");
-  uint32_t glyph = 99;
-  const icu::UnicodeString id = Current("{\"char\":\"") + Units({0xD83D}) + u"\"}";
-  EXPECT_TRUE(CharacterInfoFromEntityID(id, &info, &character, nullptr, &glyph));
-  EXPECT_EQ(info, Info(u"keep", {}, {}));
-  EXPECT_EQ(character, std::nullopt);
-  EXPECT_EQ(glyph, 0u);
+  const Reading before{false, Info(u"keep", {}, {}), u"old", u"old", 99};
+  EXPECT_TRUE(Read(Current("{\"char\":\"") + Units({0xD83D}) + u"\"}", before) ==
+              (Reading{true, before.info, std::nullopt, std::nullopt, 0}));
 }
 
 }  // namespace

@@ -23,8 +23,7 @@ VistrelItem Item(Text entity_id, Text string, Text font, std::optional<uint32_t>
 }
 
 // The IDs the panel records for these scalar values picked in the emoji font, or in no font.
-icu::UnicodeString Emoji(std::initializer_list<uint32_t> scalars,
-                         std::optional<uint32_t> glyph = {}) {
+icu::UnicodeString Emoji(std::initializer_list<uint32_t> scalars, std::optional<uint32_t> glyph = {}) {
   return EntityIDFromCharacterInfo(CharacterInfo{Scalars(scalars), kEmojiFont, glyph, {}});
 }
 icu::UnicodeString NoFont(std::initializer_list<uint32_t> scalars) {
@@ -64,21 +63,13 @@ TEST(VistrelItemFromEntityID, SplitsEntityIDsAndWrapsOpaqueStrings) {
 TEST(IsEqualRecentEntityID, SkinTonesOfOneEmojiAreOneRecent) {
   const icu::UnicodeString prefix(u"com.vantorel.lmk:");
   const struct { icu::UnicodeString a, b; bool expected; } cases[] = {
-      {Emoji({0x1F44D, 0x1F3FD}), Emoji({0x1F44D}), true},
-      {Emoji({0x1F44D, 0x1F3FB}), Emoji({0x1F44D, 0x1F3FF}), true},
-      {Emoji({0x1F44D, 0x1F3FD}), NoFont({0x1F44D}), false},
-      {Emoji({0x1F44D}), NoFont({0x1F44D}), false},
-      {NoFont({0x1F44D, 0x1F3FD}), NoFont({0x1F44D}), true},
-      {Emoji({0x261D, 0xFE0F}), Emoji({0x261D, 0x1F3FE}), true},
-      {Emoji({0x1F44D}), Emoji({0x1F44E}), false},
-      {Emoji({0x1F600}), Emoji({0x1F600}), true},
-      {Emoji({0x1F600}), Emoji({0x1F601}), false},
-      {Emoji({0x1F44D}, 3), Emoji({0x1F44D, 0x1F3FD}), true},
-      {EntityIDFromOldCharacterInfo(Scalars({0x1F44D, 0x1F3FD}), kEmojiFont, 5), Emoji({0x1F44D}),
-       true},
-      {u"opaque", u"opaque", true},
-      {u"opaque", u"Opaque", false},
-      {Emoji({0x1F44D}), u"opaque", false},
+      {Emoji({0x1F44D, 0x1F3FD}), Emoji({0x1F44D}), true}, {Emoji({0x1F44D, 0x1F3FB}), Emoji({0x1F44D, 0x1F3FF}), true},
+      {Emoji({0x1F44D, 0x1F3FD}), NoFont({0x1F44D}), false}, {Emoji({0x1F44D}), NoFont({0x1F44D}), false},
+      {NoFont({0x1F44D, 0x1F3FD}), NoFont({0x1F44D}), true}, {Emoji({0x261D, 0xFE0F}), Emoji({0x261D, 0x1F3FE}), true},
+      {Emoji({0x1F44D}), Emoji({0x1F44E}), false}, {Emoji({0x1F600}), Emoji({0x1F600}), true},
+      {Emoji({0x1F600}), Emoji({0x1F601}), false}, {Emoji({0x1F44D}, 3), Emoji({0x1F44D, 0x1F3FD}), true},
+      {EntityIDFromOldCharacterInfo(Scalars({0x1F44D, 0x1F3FD}), kEmojiFont, 5), Emoji({0x1F44D}), true},
+      {u"opaque", u"opaque", true}, {u"opaque", u"Opaque", false}, {Emoji({0x1F44D}), u"opaque", false},
       // Without a skin-tone base the IDs must match as text, so key order counts.
       {prefix + u"{\"char\":\"A\",\"glyph\":1}", prefix + u"{\"glyph\":1,\"char\":\"A\"}", false},
       {prefix + u"{\"char\":\"A\",\"glyph\":1}", prefix + u"{\"char\":\"A\",\"glyph\":1}", true},

@@ -2,7 +2,6 @@
 // (corrupt, temporary, written concurrently, by writers killed mid-write), scope paths and the
 // CFPreferences functions.
 #include <gtest/gtest.h>
-#include <poll.h>
 #include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -71,10 +70,7 @@ class PreferenceStoreTest : public ::testing::Test {
     fs::create_directories(DomainFile().parent_path());
     std::ofstream(DomainFile(), std::ios::binary) << bytes;
   }
-  void WriteDomainFile(const Value& content) {
-    const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(content);
-    WriteDomainBytes(std::string_view(reinterpret_cast<const char*>(bytes.data()), bytes.size()));
-  }
+  void WriteDomainFile(const Value& content) { WriteDomainBytes(plist::SerializeXmlPropertyList(content)); }
   // Runs `body` in a child process with a store of its own; the child exits 0 when it returns true.
   static pid_t StartWriter(const std::function<bool(PreferenceStore&)>& body) {
     const pid_t pid = fork();
@@ -224,23 +220,20 @@ TEST_F(PreferenceStoreTest, AnyUserScopeIsReadOnly) {
 // lost update shows as a key left at its first value.
 TEST_F(PreferenceStoreTest, ConcurrentProcessesAndThreadsKeepEveryKeysLastValue) {
   constexpr int kProcesses = 4, kThreads = 4, kKeys = 100;
-  auto key_of = [](int p, int t, int k) { return "p" + std::to_string(p) + "t" + std::to_string(t) + "k" + std::to_string(k); };
   std::vector<pid_t> writers;
   for (int p = 0; p < kProcesses; ++p) {
-    writers.push_back(StartWriter([&, p](PreferenceStore& store) {
+    writers.push_back(StartWriter([p](PreferenceStore& store) {
       std::atomic<bool> ok = true;
-      std::vector<std::thread> threads;
+      std::vector<std::jthread> threads;
       for (int t = 0; t < kThreads; ++t) {
         threads.emplace_back([&, t] {
-          for (int pass = 1; pass <= 2; ++pass) {
-            for (int k = 0; k < kKeys; ++k) {
-              Set(store, key_of(p, t, k), Value(pass));
-              if ((k + 1) % 50 == 0 && !Synchronize(store)) ok = false;
-            }
+          for (int n = 0; n < 2 * kKeys; ++n) {  // every key twice, at values 1 then 2
+            Set(store, std::to_string(p * kThreads + t) + "-" + std::to_string(n % kKeys), Value(n / kKeys + 1));
+            if ((n + 1) % 50 == 0 && !Synchronize(store)) ok = false;
           }
         });
       }
-      for (std::thread& thread : threads) thread.join();
+      threads.clear();
       return ok.load();
     }));
   }
@@ -248,12 +241,10 @@ TEST_F(PreferenceStoreTest, ConcurrentProcessesAndThreadsKeepEveryKeysLastValue)
     int status = 0;
     EXPECT_TRUE(waitpid(writer, &status, 0) == writer && WIFEXITED(status) && WEXITSTATUS(status) == 0);
   }
-  std::optional<Value> file = StoredFile();
+  const std::optional<Value> file = StoredFile();
   ASSERT_TRUE(file && file->AsDictionary());
   EXPECT_EQ(file->AsDictionary()->size(), std::size_t{kProcesses * kThreads * kKeys});
-  int stale = 0;
-  for (const auto& [key, value] : *file->AsDictionary()) stale += value != Value(2);
-  EXPECT_EQ(stale, 0);
+  EXPECT_EQ(std::ranges::count_if(*file->AsDictionary(), [](const auto& entry) { return entry.second != Value(2); }), 0);
 }
 
 // Writers that store one generation in all of their keys per synchronise are killed at random
@@ -288,8 +279,8 @@ TEST_F(PreferenceStoreTest, WritersKilledAtRandomMomentsNeverTearTheFile) {
     ASSERT_EQ(pipe(progress), 0);
     const pid_t victim = StartWriter(writer("killed", kill_count % 4 == 3 ? progress[1] : -1, {}));
     close(progress[1]);
-    pollfd wrote = {progress[0], POLLIN, 0};
-    if (kill_count % 4 == 3) poll(&wrote, 1, 5000);
+    char wrote;  // a byte, or the end of the pipe when the victim has gone
+    ASSERT_TRUE(kill_count % 4 != 3 || read(progress[0], &wrote, 1) >= 0);
     close(progress[0]);
     std::this_thread::sleep_for(std::chrono::microseconds(delay_us(random)));
     kill(victim, SIGKILL);
@@ -298,15 +289,15 @@ TEST_F(PreferenceStoreTest, WritersKilledAtRandomMomentsNeverTearTheFile) {
     // One read decides: a file that appears between two looks is not unparsable.
     const FileContents contents = PreferencesFileSystem().Read(DomainFile());
     if (contents.status == ReadStatus::kMissing) continue;
-    std::optional<Value> file = contents.status == ReadStatus::kOk ? plist::ParsePropertyList(contents.bytes) : std::nullopt;
-    if (!file || !file->AsDictionary()) {
-      ++unparsable;
-      continue;
-    }
+    const auto file = contents.status == ReadStatus::kOk ? plist::ParsePropertyList(contents.bytes) : std::nullopt;
+    unparsable += !file || !file->AsDictionary();
     for (auto& [prefix, last] : last_seen) {
-      const Value* first = file->Find(prefix + "0");
+      const Value* first = file ? file->Find(prefix + "0") : nullptr;  // nullptr too when not a dictionary
       if (first == nullptr) continue;
-      for (int i = 1; i < kKeysPerWriter; ++i) torn += file->Find(prefix + std::to_string(i)) == nullptr || *file->Find(prefix + std::to_string(i)) != *first;
+      for (int i = 1; i < kKeysPerWriter; ++i) {
+        const Value* other = file->Find(prefix + std::to_string(i));
+        torn += other == nullptr || *other != *first;
+      }
       went_back += *first->AsInteger() < last;
       last = *first->AsInteger();
     }
@@ -328,11 +319,7 @@ TEST(PreferencesPathTest, ScopesMapToXdgFilesAndDomainsThatCannotNameAFileToNone
   testing::IsolatedUserEnvironment env;
   const std::string host = PreferencesHostId();
   ASSERT_FALSE(host.empty());
-  const struct {
-    PreferencesUser user;
-    PreferencesHost host;
-    fs::path expected;
-  } cases[] = {
+  const struct { PreferencesUser user; PreferencesHost host; fs::path expected; } cases[] = {
       {kCFPreferencesCurrentUser, kCFPreferencesAnyHost, env.config_home() / "vantorel/Preferences/d.plist"},
       {kCFPreferencesCurrentUser, kCFPreferencesCurrentHost, env.config_home() / ("vantorel/Preferences/ByHost/d." + host + ".plist")},
       {kCFPreferencesAnyUser, kCFPreferencesAnyHost, env.config_dirs() / "vantorel/Preferences/d.plist"},
@@ -348,42 +335,36 @@ TEST(PreferencesPathTest, ScopesMapToXdgFilesAndDomainsThatCannotNameAFileToNone
 
 TEST(PreferencesPathTest, DefaultsAndIgnoredEnvironmentValues) {
   testing::IsolatedUserEnvironment env;
-  auto current = [] { return PreferencesFilePath("d", kCFPreferencesCurrentUser, kCFPreferencesAnyHost); };
-  auto any_user = [] { return PreferencesFilePath("d", kCFPreferencesAnyUser, kCFPreferencesAnyHost); };
-  env.env().Set("XDG_CONFIG_HOME", std::nullopt);
-  EXPECT_EQ(current(), env.home() / ".config/vantorel/Preferences/d.plist");
-  env.env().Set("XDG_CONFIG_HOME", "relative/dir");
-  EXPECT_EQ(current(), env.home() / ".config/vantorel/Preferences/d.plist");
-  env.env().Set("XDG_CONFIG_DIRS", "/first:/second");
-  EXPECT_EQ(any_user(), fs::path("/first/vantorel/Preferences/d.plist"));
-  env.env().Set("XDG_CONFIG_DIRS", std::nullopt);
-  EXPECT_EQ(any_user(), fs::path("/etc/xdg/vantorel/Preferences/d.plist"));
-  env.env().Set("HOME", std::nullopt);
-  EXPECT_FALSE(current().has_value());
+  const std::tuple<const char*, std::optional<std::string>, PreferencesUser, std::optional<fs::path>> steps[] = {
+      {"XDG_CONFIG_HOME", std::nullopt, kCFPreferencesCurrentUser, env.home() / ".config/vantorel/Preferences/d.plist"},
+      {"XDG_CONFIG_HOME", "relative/dir", kCFPreferencesCurrentUser, env.home() / ".config/vantorel/Preferences/d.plist"},
+      {"XDG_CONFIG_DIRS", "/first:/second", kCFPreferencesAnyUser, "/first/vantorel/Preferences/d.plist"},
+      {"XDG_CONFIG_DIRS", std::nullopt, kCFPreferencesAnyUser, "/etc/xdg/vantorel/Preferences/d.plist"},
+      {"HOME", std::nullopt, kCFPreferencesCurrentUser, std::nullopt}};
+  for (const auto& [variable, value, user, expected] : steps) {
+    env.env().Set(variable, value);
+    EXPECT_EQ(PreferencesFilePath("d", user, kCFPreferencesAnyHost), expected) << variable;
+  }
 }
 
 // The CFPreferences functions on the shared store.
 TEST(CFPreferencesTest, IntegerAndBooleanReadersFollowTheValueType) {
   testing::IsolatedUserEnvironment env;
-  const struct {
-    std::optional<Value> value;
-    std::int64_t integer;
-    bool integer_valid, boolean, boolean_valid;
-  } cases[] = {
+  const std::tuple<std::optional<Value>, std::int64_t, bool, bool, bool> cases[] = {  // integer, valid, boolean, valid
       {std::nullopt, 0, false, false, false}, {Value(42), 42, true, false, false}, {Value(-7), -7, true, false, false},
       {Value(true), 0, false, true, true},    {Value(false), 0, false, false, true}, {Value("1"), 0, false, false, false},
       {Value(1.0), 0, false, false, false},   {Value(plist::Array{1}), 0, false, false, false},
   };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.value ? ::testing::PrintToString(c.value->type()) : "absent");
-    CFPreferencesSetAppValue("key", c.value, "test.readers");
+  for (const auto& [value, integer, integer_valid, boolean, boolean_valid] : cases) {
+    SCOPED_TRACE(value ? ::testing::PrintToString(value->type()) : "absent");
+    CFPreferencesSetAppValue("key", value, "test.readers");
     ASSERT_TRUE(CFPreferencesAppSynchronize("test.readers"));
-    bool valid = !c.integer_valid;
-    EXPECT_EQ(CFPreferencesGetAppIntegerValue("key", "test.readers", &valid), c.integer);
-    EXPECT_EQ(valid, c.integer_valid);
-    valid = !c.boolean_valid;
-    EXPECT_EQ(CFPreferencesGetAppBooleanValue("key", "test.readers", &valid), c.boolean);
-    EXPECT_EQ(valid, c.boolean_valid);
+    bool valid = !integer_valid;
+    EXPECT_EQ(CFPreferencesGetAppIntegerValue("key", "test.readers", &valid), integer);
+    EXPECT_EQ(valid, integer_valid);
+    valid = !boolean_valid;
+    EXPECT_EQ(CFPreferencesGetAppBooleanValue("key", "test.readers", &valid), boolean);
+    EXPECT_EQ(valid, boolean_valid);
   }
 }
 

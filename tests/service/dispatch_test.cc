@@ -14,6 +14,7 @@ namespace {
 using Calls = std::vector<std::string>;
 
 MessageValue Str(std::string text) { return MessageValue::String(std::move(text)); }
+MessageValue U(std::uint64_t number) { return MessageValue::Uint64(number); }
 
 MessageValue Request(std::string command, std::vector<std::pair<std::string, MessageValue>> more = {}) {
   MessageValue request = MessageValue::MakeDictionary({{"command", Str(command)}});
@@ -52,23 +53,16 @@ class DispatchTest : public ::testing::Test {
     };
   }
 
+#define OP(name, ...) ops_.name = Op(#name __VA_OPT__(, ) __VA_ARGS__)
   DispatchTest() {
-    ops_.CopyRecentsIDArray = Op("CopyRecentsIDArray", &recents_);
-    ops_.SetRecentsIDArray = Op("SetRecentsIDArray");
-    ops_.AddRecentID = Op("AddRecentID");
-    ops_.CopyFavoritesIDArray = Op("CopyFavoritesIDArray", &favorites_);
-    ops_.SetFavoritesIDArray = Op("SetFavoritesIDArray");
-    ops_.CopySkinToneHistory = Op("CopySkinToneHistory", &skin_tones_);
-    ops_.SetLastSkinToneSelection = Op("SetLastSkinToneSelection");
-    ops_.CopyLastState = Op("CopyLastState", &state_);
-    ops_.SetLastState = Op("SetLastState");
-    ops_.CreateXPCCategoryDataArray = Op("CreateXPCCategoryDataArray", &categories_);
-    ops_.UpdateCountryInfoAndCheckSignificantChange = Op("UpdateCountryInfoAndCheckSignificantChange", &yes_);
-    ops_.createXPCArrayForSearchString = Op("createXPCArrayForSearchString", &matched_);
-    ops_.createXPCArrayForRelatedCharacters = Op("createXPCArrayForRelatedCharacters", &related_);
-    ops_.createXPCDictionaryForCharacterInfo = Op("createXPCDictionaryForCharacterInfo", &info_);
-    ops_.PrepareOpeningLargeVistrel = Op("PrepareOpeningLargeVistrel", &yes_);
+    OP(CopyRecentsIDArray, &recents_); OP(SetRecentsIDArray); OP(AddRecentID); OP(CopyFavoritesIDArray, &favorites_);
+    OP(SetFavoritesIDArray); OP(CopySkinToneHistory, &skin_tones_); OP(SetLastSkinToneSelection);
+    OP(CopyLastState, &state_); OP(SetLastState); OP(CreateXPCCategoryDataArray, &categories_);
+    OP(UpdateCountryInfoAndCheckSignificantChange, &yes_); OP(createXPCArrayForSearchString, &matched_);
+    OP(createXPCArrayForRelatedCharacters, &related_); OP(createXPCDictionaryForCharacterInfo, &info_);
+    OP(PrepareOpeningLargeVistrel, &yes_);
   }
+#undef OP
 
   std::optional<MessageValue> Dispatch(const MessageValue& request) {
     calls_.clear();
@@ -89,40 +83,27 @@ class DispatchTest : public ::testing::Test {
 };
 
 TEST_F(DispatchTest, CommandsMatchByPrefixInTableOrderAndOnlyReadingCommandsReply) {
-  const struct {
-    const char* command;
-    const char* first_call;  // "" when nothing may be called
-    bool replies;
-  } cases[] = {
+  // `first_call` is "" when nothing may be called.
+  const struct { const char* command, *first_call; bool replies; } cases[] = {
       {"search_matched_chars", "createXPCArrayForSearchString(s,0)", true},
       {"search_matched_charsXYZ", "createXPCArrayForSearchString(s,0)", true},
       {"search_related_chars", "createXPCArrayForRelatedCharacters(s,0)", true},
       {"search_character_info", "createXPCDictionaryForCharacterInfo(s)", true},
-      {"search_character_infos", "createXPCDictionaryForCharacterInfo(s)", true},
-      {"search_other", "", true},
+      {"search_character_infos", "createXPCDictionaryForCharacterInfo(s)", true}, {"search_other", "", true},
       {"read_categorydata", "CreateXPCCategoryDataArray([x])", true},
       {"read_categorydataX", "CreateXPCCategoryDataArray([x])", true},
       {"read_recents_favorites", "CopyRecentsIDArray(absent)", true},
       {"read_recents_favoritesX", "CopyRecentsIDArray(absent)", true},
       {"read_recents", "CopyRecentsIDArray(absent)", true},  // "read" with a recents target
-      {"save_state", "SetLastState(absent,absent)", false},
-      {"save_stateful", "SetLastState(absent,absent)", false},
+      {"save_state", "SetLastState(absent,absent)", false}, {"save_stateful", "SetLastState(absent,absent)", false},
       {"set_skintone", "SetLastSkinToneSelection(,absent)", false},
-      {"set_skintones", "SetRecentsIDArray([x],absent)", false},
-      {"set_skintonX", "SetRecentsIDArray([x],absent)", false},
-      {"readme", "CopyRecentsIDArray(absent)", true},
-      {"read", "CopyRecentsIDArray(absent)", true},
-      {"settle", "SetRecentsIDArray([x],absent)", false},
-      {"set", "SetRecentsIDArray([x],absent)", false},
-      {"adder", "AddRecentID(,absent)", false},
-      {"add", "AddRecentID(,absent)", false},
+      {"set_skintones", "SetRecentsIDArray([x],absent)", false}, {"set_skintonX", "SetRecentsIDArray([x],absent)", false},
+      {"readme", "CopyRecentsIDArray(absent)", true}, {"read", "CopyRecentsIDArray(absent)", true},
+      {"settle", "SetRecentsIDArray([x],absent)", false}, {"set", "SetRecentsIDArray([x],absent)", false},
+      {"adder", "AddRecentID(,absent)", false}, {"add", "AddRecentID(,absent)", false},
       {"open_large_viewer", "PrepareOpeningLargeVistrel(absent)", true},
       {"open_large_viewerX", "PrepareOpeningLargeVistrel(absent)", true},
-      {"open_large", "", false},
-      {"rea", "", false},
-      {"se", "", false},
-      {"Read", "", false},
-      {"", "", false},
+      {"open_large", "", false}, {"rea", "", false}, {"se", "", false}, {"Read", "", false}, {"", "", false},
   };
   for (const auto& c : cases) {
     SCOPED_TRACE(c.command);
@@ -135,7 +116,7 @@ TEST_F(DispatchTest, CommandsMatchByPrefixInTableOrderAndOnlyReadingCommandsRepl
     EXPECT_EQ(calls_.empty() ? "" : calls_[0], c.first_call);
   }
   EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary()));
-  EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary({{"command", MessageValue::Uint64(3)}})));
+  EXPECT_FALSE(Dispatch(MessageValue::MakeDictionary({{"command", U(3)}})));
   EXPECT_TRUE(calls_.empty());
 }
 
@@ -158,35 +139,30 @@ TEST_F(DispatchTest, TargetBeginningWithRecentsSelectsRecentsAnyOtherFavoritesAn
   }
 }
 
-TEST_F(DispatchTest, SearchesPutResultAndEchoTransactionId) {
-  std::optional<MessageValue> reply = Dispatch(Request(
-      "search_matched_chars",
-      {{"string", Str("cat")}, {"limit", MessageValue::Uint64(12)}, {"transactionID", MessageValue::Uint64(99)}}));
-  ASSERT_TRUE(reply);
+TEST_F(DispatchTest, RepliesCarryTheResultSearchesEchoTheTransactionIdAndOpenLargeViewerAnswersEmpty) {
+  EXPECT_EQ(Dispatch(Request("search_matched_chars",
+                             {{"string", Str("cat")}, {"limit", U(12)}, {"transactionID", U(99)}})),
+            MessageValue::MakeDictionary({{"result", matched_}, {"transactionID", U(99)}}));
   EXPECT_EQ(calls_, (Calls{"UpdateCountryInfoAndCheckSignificantChange()", "createXPCArrayForSearchString(cat,12)"}));
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"result", matched_}, {"transactionID", MessageValue::Uint64(99)}}));
-
-  reply = Dispatch(Request("search_related_chars", {{"limit", Str("12")}}));
-  ASSERT_TRUE(reply);
+  EXPECT_EQ(Dispatch(Request("search_related_chars", {{"limit", Str("12")}})),
+            MessageValue::MakeDictionary({{"result", related_}, {"transactionID", U(0)}}));
   EXPECT_EQ(calls_, Calls{"createXPCArrayForRelatedCharacters(,0)"});
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"result", related_}, {"transactionID", MessageValue::Uint64(0)}}));
-
-  reply = Dispatch(Request("search_", {{"transactionID", MessageValue::Uint64(5)}}));
-  ASSERT_TRUE(reply);
+  EXPECT_EQ(Dispatch(Request("search_", {{"transactionID", U(5)}})),
+            MessageValue::MakeDictionary({{"transactionID", U(5)}}));
   EXPECT_TRUE(calls_.empty());
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"transactionID", MessageValue::Uint64(5)}}));
+  EXPECT_EQ(Dispatch(Request("read_categorydata")), MessageValue::MakeDictionary({{"result", categories_}}));
+  EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(absent)"});
+  EXPECT_EQ(Dispatch(Request("open_large_viewer", {{"path", Str("/p")}})), MessageValue::MakeDictionary());
+  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
 }
 
 TEST_F(DispatchTest, ReadRecentsFavoritesCollectsFourValuesInOrder) {
-  std::optional<MessageValue> reply =
-      Dispatch(Request("read_recents_favorites", {{"identifier", Str("id")}, {"application", Str("app")}}));
-  ASSERT_TRUE(reply);
+  EXPECT_EQ(Dispatch(Request("read_recents_favorites", {{"identifier", Str("id")}, {"application", Str("app")}})),
+            MessageValue::MakeDictionary({{"recents", Strings({"r1", "r2"})}, {"favorites", Strings({"f1"})},
+                                          {"skintones", MessageValue::DataFromBytes(R"({"a":"b"})")},
+                                          {"state", MessageValue::DataFromBytes("{}")}}));
   EXPECT_EQ(calls_, (Calls{"CopyRecentsIDArray('id')", "CopyFavoritesIDArray('id')", "CopySkinToneHistory('id')",
                            "CopyLastState('app')"}));
-  EXPECT_EQ(*reply, MessageValue::MakeDictionary({{"recents", Strings({"r1", "r2"})},
-                                                  {"favorites", Strings({"f1"})},
-                                                  {"skintones", MessageValue::DataFromBytes(R"({"a":"b"})")},
-                                                  {"state", MessageValue::DataFromBytes("{}")}}));
   // Empty and absent lists travel as null; a missing history is left out.
   recents_ = std::vector<std::string>{};
   favorites_ = std::nullopt;
@@ -213,17 +189,10 @@ TEST_F(DispatchTest, SaveStatePassesDataOnlyWhenItParsesAsJson) {
   }
 }
 
-TEST_F(DispatchTest, CategoryDataAnswersItsResultAndOpenLargeViewerAnEmptyReplyAfterWriting) {
-  EXPECT_EQ(Dispatch(Request("read_categorydata")), MessageValue::MakeDictionary({{"result", categories_}}));
-  EXPECT_EQ(calls_, Calls{"CreateXPCCategoryDataArray(absent)"});
-  EXPECT_EQ(Dispatch(Request("open_large_viewer", {{"path", Str("/p")}})), MessageValue::MakeDictionary());
-  EXPECT_EQ(calls_, Calls{"PrepareOpeningLargeVistrel('/p')"});
-}
-
 // Every string a request carries goes through the conversion: one that does not convert, like a
 // value of another type, is missing (an item then reads empty, an identifier absent).
 TEST_F(DispatchTest, WrongTypedValuesAndTextThatDoesNotConvertReadAsAbsent) {
-  for (const MessageValue& bad : {MessageValue::Uint64(1), Str("\xff\xfe")}) {
+  for (const MessageValue& bad : {U(1), Str("\xff\xfe")}) {
     Dispatch(Request("set_skintone", {{"item", bad}, {"identifier", bad}}));
     EXPECT_EQ(calls_, Calls{"SetLastSkinToneSelection(,absent)"}) << bad;
     Dispatch(Request("save_state", {{"application", bad}}));

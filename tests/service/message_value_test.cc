@@ -14,12 +14,9 @@ namespace {
 using Strings = std::vector<std::string>;
 
 TEST(MessageValue, GettersReadWrongTypesAndNonDictionariesAsAbsent) {
-  MessageValue dictionary = MessageValue::MakeDictionary({
-      {"s", MessageValue::String("x")},
-      {"u", MessageValue::Uint64(4)},
-      {"i", MessageValue::Int64(-4)},
-      {"d", MessageValue::DataFromBytes("b")},
-  });
+  MessageValue dictionary = MessageValue::MakeDictionary(
+      {{"s", MessageValue::String("x")}, {"u", MessageValue::Uint64(4)}, {"i", MessageValue::Int64(-4)},
+       {"d", MessageValue::DataFromBytes("b")}});
   EXPECT_EQ(*dictionary.GetString("s"), "x");
   EXPECT_EQ(dictionary.GetString("u"), nullptr);
   EXPECT_EQ(dictionary.GetString("missing"), nullptr);

@@ -21,47 +21,47 @@ namespace {
 class InProcessService {
  public:
   explicit InProcessService(const ServiceOperations& operations) {
-    socket_path_ = dir_.path() / "socket";
     std::optional<ServiceListener> listener = BindServiceSocket(socket_path_);
     EXPECT_TRUE(listener);
-    server_ = std::make_unique<ServiceServer>(
-        listener->fd,
-        [this, &operations](const std::shared_ptr<ServiceConnection>& connection) {
-          accepted_ = connection;
-          connection->SetEventHandler([this, connection, &operations](const ConnectionEvent& event) {
-            if (std::holds_alternative<ConnectionClosed>(event)) {
-              std::lock_guard<std::mutex> hold(mutex_);
-              ++closed_;
-              changed_.notify_all();
-            }
-            HandleServiceMessage(*connection, event, operations);
-          });
-          connection->Resume();
-        },
-        2);
+    auto serve = [this, &operations](const std::shared_ptr<ServiceConnection>& connection) {
+      accepted_ = connection;
+      connection->SetEventHandler([this, connection, &operations](const ConnectionEvent& event) {
+        if (std::holds_alternative<ConnectionClosed>(event)) {
+          std::lock_guard hold(mutex_);
+          ++closed_;
+          changed_.notify_all();
+        }
+        HandleServiceMessage(*connection, event, operations);
+      });
+      connection->Resume();
+    };
+    server_ = std::make_unique<ServiceServer>(listener->fd, serve, 2);
     server_->Start();
   }
   RawConnection Connect() { return std::move(*RawConnection::Open(socket_path_)); }
-  const std::filesystem::path& socket_path() const { return socket_path_; }
   void Stop() { server_->Stop(); }
   // True once `count` connections have been closed, within a few seconds.
   bool WaitForClosed(int count) {
-    std::unique_lock<std::mutex> hold(mutex_);
+    std::unique_lock hold(mutex_);
     return changed_.wait_for(hold, 5s, [&] { return closed_ >= count; });
   }
+
+  ScopedTempDir dir_;
+  const std::filesystem::path socket_path_ = dir_.path() / "socket";
   std::weak_ptr<ServiceConnection> accepted_;  // the latest connection
 
  private:
-  ScopedTempDir dir_;
-  std::filesystem::path socket_path_;
   std::mutex mutex_;
   std::condition_variable changed_;
   int closed_ = 0;
   std::unique_ptr<ServiceServer> server_;
 };
 
-MessageValue Info(const char* text) {
-  return Command("search_character_info", {{"string", MessageValue::String(text)}});
+MessageValue Info(const char* text) { return Command("search_character_info", {{"string", MessageValue::String(text)}}); }
+// The "for" member of a reply's result, or "no reply".
+std::string For(const std::optional<MessageValue>& reply) {
+  const std::string* text = reply && reply->Find("result") ? reply->Find("result")->GetString("for") : nullptr;
+  return text ? *text : "no reply";
 }
 
 // Character info that blocks on "slow" until released, and records the order of calls.
@@ -71,7 +71,7 @@ TEST(ServiceRuntime, SlowRequestDelaysItsOwnConnectionButNotAnother) {
   std::mutex mutex;
   std::vector<std::string> log;
   auto record = [&](std::string entry) {
-    std::lock_guard<std::mutex> hold(mutex);
+    std::lock_guard hold(mutex);
     log.push_back(std::move(entry));
   };
   ServiceOperations operations;
@@ -88,16 +88,10 @@ TEST(ServiceRuntime, SlowRequestDelaysItsOwnConnectionButNotAnother) {
   const std::uint64_t blocked = slow.SendMessage(Info("slow"));
   const std::uint64_t queued = slow.SendMessage(Info("after"));
   // The other connection is answered while the slow request still runs.
-  std::optional<MessageValue> reply = fast.ReadReply(fast.SendMessage(Info("fast")));
-  ASSERT_TRUE(reply);
-  EXPECT_EQ(*reply->Find("result")->GetString("for"), "fast");
-
+  EXPECT_EQ(For(fast.ReadReply(fast.SendMessage(Info("fast")))), "fast");
   release.set_value();
-  std::optional<MessageValue> first = slow.ReadReply(blocked);
-  std::optional<MessageValue> second = slow.ReadReply(queued);
-  ASSERT_TRUE(first && second);
-  EXPECT_EQ(*first->Find("result")->GetString("for"), "slow");
-  EXPECT_EQ(*second->Find("result")->GetString("for"), "after");
+  EXPECT_EQ(For(slow.ReadReply(blocked)), "slow");
+  EXPECT_EQ(For(slow.ReadReply(queued)), "after");
   // One at a time on a connection: "after" starts only when "slow" has ended.
   auto at = [&](const char* entry) { return std::find(log.begin(), log.end(), entry) - log.begin(); };
   EXPECT_LT(at("end slow"), at("start after"));
@@ -173,13 +167,13 @@ TEST(ServiceRuntime, PeerOfAnotherUidIsRefused) {
   ServiceOperations none;
   InProcessService service(none);
   // Let uid 65534 reach the socket, so that only the service's own check stands in its way.
-  chmod(service.socket_path().parent_path().c_str(), 0711);
-  chmod(service.socket_path().c_str(), 0666);
+  chmod(service.socket_path_.parent_path().c_str(), 0711);
+  chmod(service.socket_path_.c_str(), 0666);
   const std::string request = EncodeFrame(Frame{FrameKind::kWantsReply, 1, Command("search_x")});
   const pid_t child = fork();  // the child makes system calls only
   if (child == 0) {
     if (setgroups(0, nullptr) != 0 || setresgid(65534, 65534, 65534) != 0 || setresuid(65534, 65534, 65534) != 0) _exit(2);
-    const int fd = ConnectUnixSocket(service.socket_path());
+    const int fd = ConnectUnixSocket(service.socket_path_);
     if (fd < 0) _exit(3);
     const timeval wait{3, 0};
     setsockopt(fd, SOL_SOCKET, SO_RCVTIMEO, &wait, sizeof wait);
@@ -202,12 +196,10 @@ TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
   EXPECT_TRUE(EnsurePrivateDirectory(fresh, &why)) << why;
   EXPECT_EQ(std::filesystem::status(fresh).permissions(), std::filesystem::perms::owner_all);
 
-  std::filesystem::create_directory(dir.path() / "open");
-  chmod((dir.path() / "open").c_str(), 0755);
+  for (const auto& [name, mode] : {std::pair{"open", 0755}, {"foreign", 0700}}) mkdir((dir.path() / name).c_str(), mode);
+  chmod((dir.path() / "open").c_str(), 0755);  // whatever the umask
   std::filesystem::create_directory_symlink(fresh, dir.path() / "link");
   std::ofstream(dir.path() / "file") << "x";
-  std::filesystem::create_directory(dir.path() / "foreign");
-  chmod((dir.path() / "foreign").c_str(), 0700);
   std::vector<std::pair<std::string, std::string>> refused = {{"open", "0700"}, {"link", ""}, {"file", ""}};
   if (chown((dir.path() / "foreign").c_str(), 65534, 65534) == 0) refused.emplace_back("foreign", "another user");
   for (const auto& [name, reason] : refused) {
@@ -216,10 +208,8 @@ TEST(PrivateRuntimeDirectory, AcceptsOnlyAnOwnDirectoryOfMode0700) {
   }
 }
 
-TEST(ServiceSocketPathRule, UsesRuntimeDirectoryWhenSet) {
-  ScopedEnv env;
-  env.Set("XDG_RUNTIME_DIR", "/run/user/1234");
-  EXPECT_EQ(ServiceSocketPath(), std::filesystem::path("/run/user/1234/com.vantorel.Lumeris.FileService"));
+// The socket path under XDG_RUNTIME_DIR is pinned by the socket activation test.
+TEST(ServiceSocketPathRule, FallbackRuntimeDirectoryIsPerUser) {
   EXPECT_EQ(FallbackRuntimeDirectory(1234), std::filesystem::path("/tmp/lumeris-1234"));
 }
 

@@ -10,22 +10,14 @@ namespace {
 
 MessageValue SampleBody() {
   return MessageValue::MakeDictionary({
-      {"null", MessageValue::Null()},
-      {"true", MessageValue::Bool(true)},
-      {"false", MessageValue::Bool(false)},
-      {"zero", MessageValue::Uint64(0)},
-      {"u8", MessageValue::Uint64(200)},
-      {"u64", MessageValue::Uint64(UINT64_MAX)},
-      {"negative", MessageValue::Int64(-1)},
-      {"int64 min", MessageValue::Int64(INT64_MIN)},
-      {"double", MessageValue::Double(-2.5)},
-      {"integral double", MessageValue::Double(5.0)},
-      {"negative integral double", MessageValue::Double(-3.0)},
-      {"string", MessageValue::String("text")},
+      {"null", MessageValue::Null()}, {"true", MessageValue::Bool(true)}, {"false", MessageValue::Bool(false)},
+      {"zero", MessageValue::Uint64(0)}, {"u8", MessageValue::Uint64(200)}, {"u64", MessageValue::Uint64(UINT64_MAX)},
+      {"negative", MessageValue::Int64(-1)}, {"int64 min", MessageValue::Int64(INT64_MIN)},
+      {"double", MessageValue::Double(-2.5)}, {"integral double", MessageValue::Double(5.0)},
+      {"negative integral double", MessageValue::Double(-3.0)}, {"string", MessageValue::String("text")},
       {"invalid utf-8", MessageValue::String("\xff\xc3(")},
       {"embedded nul", MessageValue::String(std::string("a\0b", 3))},
-      {"data", MessageValue::DataFromBytes(std::string("\0\x01\xff", 3))},
-      {"empty data", MessageValue::Data({})},
+      {"data", MessageValue::DataFromBytes(std::string("\0\x01\xff", 3))}, {"empty data", MessageValue::Data({})},
       {"array", MessageValue::MakeArray({MessageValue::Uint64(1), MessageValue::MakeArray(),
                                          MessageValue::MakeDictionary()})},
       {"", MessageValue::String("empty key")},
@@ -49,8 +41,7 @@ TEST(Wire, FramesRoundTripWhateverTheChunking) {
     EXPECT_FALSE(decoder.Finish()) << chunk;
     ASSERT_EQ(received.size(), 3u) << chunk;
     for (std::size_t i = 0; i < 3; ++i) {
-      EXPECT_EQ(received[i].kind, sent[i].kind);
-      EXPECT_EQ(received[i].id, sent[i].id);
+      EXPECT_TRUE(received[i].kind == sent[i].kind && received[i].id == sent[i].id) << chunk;
       EXPECT_EQ(received[i].body, sent[i].body) << chunk;
     }
   }
@@ -61,16 +52,11 @@ std::optional<MessageValue> DecodeValue(const std::string& value_bytes) {
   FrameDecoder decoder;
   decoder.Feed(std::string("\x93\x01\x01\x81\xa1v", 6) + value_bytes);
   std::optional<Frame> frame = decoder.Next();
-  if (!frame) return std::nullopt;
-  return *frame->body.Find("v");
+  return frame ? std::optional(*frame->body.Find("v")) : std::nullopt;
 }
 
 TEST(Wire, IntegerAndFloatFormatsMapToTheirKinds) {
-  struct Case {
-    const char* name;
-    std::string bytes;
-    MessageValue expected;
-  };
+  struct Case { const char* name; std::string bytes; MessageValue expected; };
   const Case cases[] = {
       {"positive fixint", "\x05", MessageValue::Uint64(5)},
       {"uint16", std::string("\xcd\x01\x00", 3), MessageValue::Uint64(256)},
@@ -85,25 +71,13 @@ TEST(Wire, IntegerAndFloatFormatsMapToTheirKinds) {
       {"str8", std::string("\xd9\x02hi", 4), MessageValue::String("hi")},
       {"bin8", std::string("\xc4\x01\x00", 3), MessageValue::DataFromBytes(std::string("\0", 1))},
   };
-  for (const Case& c : cases) {
-    std::optional<MessageValue> value = DecodeValue(c.bytes);
-    ASSERT_TRUE(value) << c.name;
-    EXPECT_EQ(*value, c.expected) << c.name;
-  }
+  for (const Case& c : cases) EXPECT_EQ(DecodeValue(c.bytes), c.expected) << c.name;
 }
 
 std::string Nested(std::size_t depth) { return std::string(depth, '\x91') + '\xc0'; }
 
-TEST(Wire, DepthCountsEveryContainerUpToSixtyFour) {
-  EXPECT_TRUE(DecodeValue(Nested(62)));  // the envelope and the body are two of the 64
-}
-
 TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
-  struct Case {
-    const char* name;
-    std::string bytes;
-    FrameError error;
-  };
+  struct Case { const char* name; std::string bytes; FrameError error; };
   const std::string envelope("\x93\x01\x01", 3);
   const Case cases[] = {
       {"never-used byte", std::string("\xc1", 1), FrameError::kBadMessagePack},
@@ -118,11 +92,9 @@ TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
       {"nil key", envelope + std::string("\x81\xc0\xc0", 3), FrameError::kNonStringKey},
       {"bin key", envelope + std::string("\x81\xc4\x01k\xc0", 5), FrameError::kNonStringKey},
       {"map key", envelope + std::string("\x81\x80\xc0", 3), FrameError::kNonStringKey},
-      {"nested integer key", envelope + std::string("\x81\xa1v\x81\x02\xc0", 6),
-       FrameError::kNonStringKey},
+      {"nested integer key", envelope + std::string("\x81\xa1v\x81\x02\xc0", 6), FrameError::kNonStringKey},
       {"fixext", envelope + std::string("\x81\xa1v\xd4\x01\x00", 6), FrameError::kExtValue},
-      {"ext8 in array", envelope + std::string("\x81\xa1v\x91\xc7\x01\x05\x00", 8),
-       FrameError::kExtValue},
+      {"ext8 in array", envelope + std::string("\x81\xa1v\x91\xc7\x01\x05\x00", 8), FrameError::kExtValue},
       {"65 containers", envelope + std::string("\x81\xa1v", 3) + Nested(63), FrameError::kTooDeep},
   };
   for (const Case& c : cases) {
@@ -134,6 +106,7 @@ TEST(WireErrors, MalformedInputIsReportedWithItsReason) {
     decoder.Feed(EncodeFrame(Frame{}));
     EXPECT_FALSE(decoder.Next()) << c.name;
   }
+  EXPECT_TRUE(DecodeValue(Nested(62))) << "64 containers: the envelope, the body and 62 more";
 }
 
 // [1, 1, {"v": bin32 of `payload` bytes}]: 11 bytes of header and the payload.
@@ -168,10 +141,6 @@ TEST(WireErrors, StreamEndingInsideAFrameIsTruncated) {
     EXPECT_FALSE(decoder.error());
     EXPECT_EQ(decoder.Finish(), FrameError::kTruncated) << cut;
   }
-  FrameDecoder whole;
-  whole.Feed(frame);
-  EXPECT_TRUE(whole.Next());
-  EXPECT_FALSE(whole.Finish());
 }
 
 }  // namespace

@@ -58,11 +58,8 @@ inline std::filesystem::path DomainFile(std::string_view domain) {
 inline void SeedDomain(std::string_view domain, const plist::Dictionary& contents) {
   const std::filesystem::path path = DomainFile(domain);
   std::filesystem::create_directories(path.parent_path());
-  const std::vector<std::uint8_t> bytes = plist::SerializeBinaryPropertyList(plist::Value(contents));
-  const std::filesystem::path temporary = path.string() + ".seed";
-  std::ofstream(temporary, std::ios::binary)
-      .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
-  std::filesystem::rename(temporary, path);
+  std::ofstream(path.string() + ".seed") << plist::SerializeXmlPropertyList(plist::Value(contents));
+  std::filesystem::rename(path.string() + ".seed", path);
 }
 inline void SeedStore(const plist::Dictionary& contents) { SeedDomain("com.vantorel.Lumeris", contents); }
 

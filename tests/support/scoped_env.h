@@ -25,43 +25,34 @@ class ScopedEnv {
   ScopedEnv(const ScopedEnv&) = delete;
   ScopedEnv& operator=(const ScopedEnv&) = delete;
   ~ScopedEnv() {
-    for (auto it = saved_.rbegin(); it != saved_.rend(); ++it) {
-      if (it->second) {
-        setenv(it->first.c_str(), it->second->c_str(), 1);
-      } else {
-        unsetenv(it->first.c_str());
-      }
-    }
+    for (auto it = saved_.rbegin(); it != saved_.rend(); ++it) Apply(it->first, it->second);
   }
 
   // Sets `name` to `value`; std::nullopt unsets it.
   void Set(const std::string& name, const std::optional<std::string>& value) {
     const char* old = getenv(name.c_str());
     saved_.emplace_back(name, old ? std::optional<std::string>(old) : std::nullopt);
-    if (value) {
-      setenv(name.c_str(), value->c_str(), 1);
-    } else {
-      unsetenv(name.c_str());
-    }
+    Apply(name, value);
   }
 
  private:
+  static void Apply(const std::string& name, const std::optional<std::string>& value) {
+    value ? setenv(name.c_str(), value->c_str(), 1) : unsetenv(name.c_str());
+  }
+
   std::vector<std::pair<std::string, std::optional<std::string>>> saved_;
 };
 
 class IsolatedUserEnvironment {
  public:
   IsolatedUserEnvironment() {
-    const auto& root = dir_.path();
-    for (const char* sub : {"home", "config", "config-dirs", "runtime"}) {
-      std::filesystem::create_directories(root / sub);
+    for (const auto& [variable, sub] : {std::pair{"HOME", "home"}, {"XDG_CONFIG_HOME", "config"},
+                                        {"XDG_CONFIG_DIRS", "config-dirs"}, {"XDG_RUNTIME_DIR", "runtime"}}) {
+      std::filesystem::create_directories(dir_.path() / sub);
+      env_.Set(variable, (dir_.path() / sub).string());
     }
-    chmod((root / "runtime").c_str(), 0700);
-    env_.Set("HOME", (root / "home").string());
-    env_.Set("XDG_CONFIG_HOME", (root / "config").string());
-    env_.Set("XDG_CONFIG_DIRS", (root / "config-dirs").string());
-    env_.Set("XDG_RUNTIME_DIR", (root / "runtime").string());
-    env_.Set("XDG_STATE_HOME", (root / "state").string());
+    chmod(runtime_dir().c_str(), 0700);
+    env_.Set("XDG_STATE_HOME", state_home().string());
   }
 
   const std::filesystem::path& root() const { return dir_.path(); }

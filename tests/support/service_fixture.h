@@ -60,8 +60,7 @@ inline int ConnectUnixSocket(const std::filesystem::path& path) {
 // A request dictionary with "command" and further keys.
 inline MessageValue Command(std::string command,
                             std::vector<std::pair<std::string, MessageValue>> more = {}) {
-  MessageValue request = MessageValue::MakeDictionary();
-  request.Set("command", MessageValue::String(std::move(command)));
+  MessageValue request = MessageValue::MakeDictionary({{"command", MessageValue::String(std::move(command))}});
   for (auto& [key, value] : more) request.Set(key, std::move(value));
   return request;
 }
@@ -69,16 +68,13 @@ inline MessageValue Command(std::string command,
 class RawConnection {
  public:
   static std::optional<RawConnection> Open(const std::filesystem::path& path) {
-    int fd = ConnectUnixSocket(path);
-    if (fd < 0) return std::nullopt;
-    return RawConnection(fd);
+    const int fd = ConnectUnixSocket(path);
+    return fd < 0 ? std::nullopt : std::optional(RawConnection(fd));
   }
   RawConnection(RawConnection&& other) noexcept
       : fd_(std::exchange(other.fd_, -1)), next_id_(other.next_id_) {}
   RawConnection& operator=(RawConnection&&) = delete;
-  ~RawConnection() {
-    if (fd_ >= 0) close(fd_);
-  }
+  ~RawConnection() { if (fd_ >= 0) close(fd_); }
 
   // Writes all of `bytes`; false when the peer has gone.
   bool SendBytes(std::string_view bytes) {
@@ -114,8 +110,7 @@ class RawConnection {
   }
   // True when the peer closes the connection within `timeout` (bytes it sends first are read).
   bool WaitForPeerClose(std::chrono::milliseconds timeout = 3s) {
-    const auto deadline = std::chrono::steady_clock::now() + timeout;
-    while (!peer_closed_) {
+    for (const auto deadline = std::chrono::steady_clock::now() + timeout; !peer_closed_;) {
       if (!ReadSome(deadline)) return false;
     }
     return true;
@@ -131,12 +126,9 @@ class RawConnection {
     pollfd waiting{fd_, POLLIN, 0};
     if (left.count() <= 0 || poll(&waiting, 1, static_cast<int>(left.count())) <= 0) return false;
     char buffer[65536];
-    ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
-    if (n <= 0) {
-      peer_closed_ = true;
-    } else {
-      decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
-    }
+    const ssize_t n = recv(fd_, buffer, sizeof buffer, 0);
+    peer_closed_ = n <= 0;
+    if (n > 0) decoder_.Feed(std::string_view(buffer, static_cast<std::size_t>(n)));
     return true;
   }
 
@@ -195,9 +187,7 @@ class ServiceProcess {
 class ServiceTest : public ::testing::Test {
  protected:
   void SetUp() override {
-    std::optional<std::filesystem::path> path = ServiceSocketPath();
-    ASSERT_TRUE(path);
-    socket_path_ = *path;
+    socket_path_ = ServiceSocketPath().value();
     ASSERT_TRUE(service_.Start(socket_path_)) << "cannot start " << FileServiceProgram();
   }
 

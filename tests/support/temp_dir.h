@@ -23,9 +23,8 @@ class ScopedTempDir {
     path_ = pattern;
   }
   ~ScopedTempDir() {
-    if (path_.empty()) return;
     std::error_code ignored;
-    std::filesystem::remove_all(path_, ignored);
+    if (!path_.empty()) std::filesystem::remove_all(path_, ignored);
   }
   ScopedTempDir(ScopedTempDir&& other) noexcept : path_(std::move(other.path_)) { other.path_.clear(); }
   ScopedTempDir& operator=(ScopedTempDir&&) = delete;

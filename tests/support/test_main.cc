@@ -9,6 +9,7 @@
 #include <signal.h>
 #include <stdio.h>
 #include <stdlib.h>
+#include <string.h>
 #include <sys/stat.h>
 
 #include <filesystem>
@@ -23,10 +24,7 @@ namespace {
 
 void EnterSandbox() {
   const std::filesystem::path sandbox = LUMERIS_TEST_SANDBOX;
-  const struct {
-    const char* variable;
-    const char* directory;
-  } kDirectories[] = {
+  const struct { const char* variable; const char* directory; } kDirectories[] = {
       {"HOME", "home"},
       {"XDG_CONFIG_HOME", "config"},
       {"XDG_CONFIG_DIRS", "config-dirs"},
@@ -55,9 +53,8 @@ class PrivateSessionBus {
     char address[512] = {};
     long pid = 0;
     if (fgets(address, sizeof address, out) != nullptr && fscanf(out, "%ld", &pid) == 1) {
-      std::string text(address);
-      while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
-      setenv("DBUS_SESSION_BUS_ADDRESS", text.c_str(), 1);
+      address[strcspn(address, "\r\n")] = '\0';
+      setenv("DBUS_SESSION_BUS_ADDRESS", address, 1);
       pid_ = static_cast<pid_t>(pid);
     }
     pclose(out);
