@@ -63,6 +63,13 @@ TEST_F(PickerWindowTest, GreekShowsAlphaAndAFavouriteReachesAnotherPickerWithout
   EXPECT_TRUE(first->skin_tone_buttons().empty());
   first->favorite_button().activate();
 
+  // The second picker's Favourites section gets it through the change notification (checked on
+  // the model: which section the grid shows can change while the categories load), then shows it.
+  ASSERT_TRUE(Await([&] {
+    const auto& sections = second->model().sections();
+    const std::optional<std::size_t> favourites = second->model().SectionIndex("Favorites");
+    return favourites && sections[*favourites].characters == std::vector<std::string>{"α"};
+  })) << "the second picker did not get the favourite";
   ASSERT_TRUE(second->ShowSection("Favorites"));
   EXPECT_TRUE(Await([&] { return CellOf(*second, "α") == 0; })) << "the second picker does not show the favourite";
   EXPECT_EQ(StoredList("favorites"), std::vector<std::string>{"com.vantorel.lmk:{\"char\":\"α\"}"});
