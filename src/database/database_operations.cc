@@ -7,6 +7,7 @@
 
 #include "categories/regional_restriction.h"
 #include "database/character_database.h"
+#include "database/font_queries.h"
 #include "platform/font_coverage.h"
 #include "text/utf8.h"
 
@@ -45,10 +46,12 @@ void PrepareCharacterDatabaseInBackground() {
   sigfillset(&all);
   sigset_t previous;
   pthread_sigmask(SIG_BLOCK, &all, &previous);
+  // The index and the font lists (which the two font questions build on first use) are read on
+  // two threads at once, so that the first search waits for the longer of the two only.
+  std::thread([] { LMCharacterDatabase::sharedDatabase().PrepareSearchIndex(); }).detach();
   std::thread([] {
-    LMCharacterDatabase::sharedDatabase().PrepareSearchIndex();
-    // The two font questions build their font lists on first use.
     DefaultLikeFontDrawsString(icu::UnicodeString(u"a"));
+    ColorFontDrawsString(kColorEmojiFontName, icu::UnicodeString(u"a"));
   }).detach();
   pthread_sigmask(SIG_SETMASK, &previous, nullptr);
 }
