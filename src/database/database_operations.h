@@ -20,10 +20,11 @@ namespace lumeris {
 // member as it is.
 void InstallDatabaseOperations(ServiceOperations& operations);
 
-// Reads the shared database's search index and loads the fonts on a thread of its own, so that
-// the first search after the service starts finds them ready (a search arriving meanwhile is
-// answered by the reference rules). The thread takes none of the process's signals. For the
-// service's start, before the service blocks its stop signals.
+// Reads the shared database's search index and loads the font lists, each on a thread of its
+// own, so that the first search after the service starts finds them ready (a search arriving
+// meanwhile waits for the stored index, or is answered by the reference rules while an index is
+// built from the table). The threads take none of the process's signals. For the service's
+// start, before the service blocks its stop signals.
 void PrepareCharacterDatabaseInBackground();
 
 }  // namespace lumeris
