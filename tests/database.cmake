@@ -20,7 +20,7 @@ lumeris_add_gtest(lumeris_database_e2e_test
 if(NOT LUMERIS_SANITIZE)
   lumeris_add_gtest(lumeris_database_differential_test
     SOURCES ${CMAKE_CURRENT_LIST_DIR}/database/differential_test.cc
-    LIBS lumeris_database lumeris_categories lumeris_font_coverage lumeris_preferences lumeris SQLite::SQLite3
+    LIBS lumeris_service_fixture lumeris_database lumeris_categories lumeris_font_coverage lumeris_preferences lumeris SQLite::SQLite3
     LABELS database)
 endif()
 

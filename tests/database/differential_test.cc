@@ -2,6 +2,10 @@
 // every related character, with the limits that matter, outside and inside China. Both databases
 // must reply element for element the same.
 //
+// Information records have one implementation; the third test compares the service's records,
+// through dispatch and the wire, with the reference read in this process, for a sample of
+// characters with and without skin tones and for misses (the suite asks for 300, a full run 5,000).
+//
 // The suite runs a seeded subset: 60 search requests whose text has three bytes or more and no
 // wildcard (each text with one of the limits, half of them in each country), and 120 related
 // characters. LUMERIS_DIFFERENTIAL_REQUESTS=N runs N search
@@ -10,6 +14,7 @@
 // long run can use every core (the M runs together cover the same requests as one).
 #include <gtest/gtest.h>
 #include <sqlite3.h>
+#include <unicode/uchar.h>
 #include <stdio.h>
 #include <stdlib.h>
 
@@ -23,6 +28,7 @@
 #include "categories/system_bundles.h"
 #include "database/character_database.h"
 #include "support/scoped_env.h"
+#include "support/service_fixture.h"
 #include "text/utf8.h"
 
 namespace lumeris {
@@ -210,6 +216,54 @@ TEST_F(DifferentialTest, RelatedCharactersEqualTheReference) {
   }
   EXPECT_EQ(differences, 0u) << "of " << requests << " requests";
   printf("%zu related-character requests compared, %zu differences\n", requests, differences);
+}
+
+using namespace std::chrono_literals;
+
+class InformationDifferentialTest : public testing::ServiceTest {};
+
+TEST_F(InformationDifferentialTest, ServiceRecordsEqualTheReference) {
+  const char* requests = getenv("LUMERIS_DIFFERENTIAL_REQUESTS");
+  const std::size_t count = requests != nullptr && atoi(requests) > 0 ? 5000 : 300;
+  std::mt19937_64 random{20261123};
+  std::vector<std::string> characters = Column("CharacterDB", "select uchr from unihan_dict");
+  ASSERT_GT(characters.size(), count);
+  std::shuffle(characters.begin(), characters.end(), random);
+  characters.resize(count);
+  // Every emoji that takes a skin tone, in the sample or not, with one of the five tones; and misses.
+  for (const std::string& row : Column("CharacterDB", "select uchr from unihan_dict")) {
+    const icu::UnicodeString text = DecodeUtf8Lenient(row);
+    if (text.countChar32() <= 2 && u_hasBinaryProperty(text.char32At(0), UCHAR_EMOJI_MODIFIER_BASE)) {
+      const icu::UnicodeString toned =
+          icu::UnicodeString(text.char32At(0)).append(static_cast<UChar32>(0x1F3FB + characters.size() % 5));
+      characters.push_back(EncodeUtf8Lenient(toned));
+    }
+  }
+  for (const char* miss : {"", "ab", "\xF0\x9F\x91\x8D\xF0\x9F\x8F\xBB\xF0\x9F\x8F\xBB", "%", "'"})
+    characters.emplace_back(miss);
+
+  LMCharacterDatabase reference(&BundleResource, FontQueries::Installed(),
+                                LMCharacterDatabase::Rules::kReference);
+  testing::RawConnection connection = Connect();
+  std::size_t differences = 0, records = 0;
+  for (const std::string& character : characters) {
+    const MessageValue expected = reference.createXPCDictionaryForCharacterInfo(DecodeUtf8Lenient(character));
+    const std::optional<MessageValue> reply = connection.ReadReply(
+        connection.SendMessage(testing::Command(
+            "search_character_info",
+            {{"string", MessageValue::String(character)}, {"transactionID", MessageValue::Uint64(1)}})),
+        10s);
+    const MessageValue* actual = reply ? reply->Find("result") : nullptr;
+    records += !expected.AsDictionary()->empty();
+    if ((actual == nullptr || *actual != expected) && ++differences <= 5) {
+      ADD_FAILURE() << "\"" << character << "\"\n service:   " << (actual ? Describe(*actual) : "no reply")
+                    << "\n reference: " << Describe(expected);
+    }
+  }
+  EXPECT_GT(records, count / 2);
+  EXPECT_EQ(differences, 0u) << "of " << characters.size() << " characters";
+  printf("%zu information requests compared (%zu records), %zu differences\n", characters.size(), records,
+         differences);
 }
 
 }  // namespace
